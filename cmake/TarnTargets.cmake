@@ -1,0 +1,72 @@
+# SPDX-License-Identifier: Apache-2.0
+# What every target of the house shares: language level, warnings, visibility, sanitizers,
+# and one line per test.
+
+if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
+  set(CMAKE_BUILD_TYPE Release CACHE STRING "Build type" FORCE)
+endif()
+set(CMAKE_CXX_STANDARD 17)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_C_STANDARD 11)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_C_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
+set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
+set(CMAKE_RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/bin")
+set(CMAKE_LIBRARY_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/lib")
+set(CMAKE_INSTALL_RPATH "$ORIGIN")
+
+find_program(TARN_CCACHE ccache)
+if(TARN_CCACHE AND NOT CMAKE_CXX_COMPILER_LAUNCHER)
+  set(CMAKE_C_COMPILER_LAUNCHER "${TARN_CCACHE}")
+  set(CMAKE_CXX_COMPILER_LAUNCHER "${TARN_CCACHE}")
+endif()
+
+# Contraction is a decision of the source, never of the compiler: one multiply-add gives the
+# same bits on every device only if it is fused where, and only where, the code says so.
+add_compile_options(-ffp-contract=off)
+
+if(TARN_SANITIZE)
+  add_compile_options(-fsanitize=${TARN_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=all)
+  add_link_options(-fsanitize=${TARN_SANITIZE})
+endif()
+
+# Warnings for our own targets only, never for those who link us.
+function(tarn_warnings target)
+  target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic -Wshadow -Wconversion
+                                           $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>)
+  if(TARN_WERROR)
+    target_compile_options(${target} PRIVATE -Werror)
+  endif()
+endfunction()
+
+# tarn_shared_library(TARGET OUTPUT_NAME EXPORT_NAME SOURCES...)
+# A shared library with the house's visibility and versioning, and the alias tarn::EXPORT_NAME.
+function(tarn_shared_library target output export)
+  add_library(${target} SHARED ${ARGN})
+  add_library(tarn::${export} ALIAS ${target})
+  set_target_properties(${target} PROPERTIES OUTPUT_NAME ${output} EXPORT_NAME ${export}
+                        VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR})
+  target_link_options(${target} PRIVATE -Wl,--no-undefined -Wl,--as-needed)
+  if(TARN_SANITIZE)
+    set_property(TARGET ${target} PROPERTY LINK_OPTIONS "")
+  endif()
+  tarn_warnings(${target})
+endfunction()
+
+# tarn_test(NAME SOURCES file... [LIBS target...] [ENV NAME=VALUE...])
+# One GoogleTest program. The prefix of the name (kat_, law_, parity_, refuse_, unit_, abi_,
+# consumer_) says the kind of proof and becomes the CTest label. The cases of each program are
+# written as XML to <build>/test-results, from which `./run test` counts passed, failed, skipped.
+function(tarn_test name)
+  cmake_parse_arguments(PARSE_ARGV 1 T "" "" "SOURCES;LIBS;ENV")
+  add_executable(${name} ${T_SOURCES})
+  tarn_warnings(${name})
+  target_link_libraries(${name} PRIVATE ${T_LIBS} GTest::gtest GTest::gtest_main)
+  add_test(NAME ${name} COMMAND ${name})
+  string(REGEX MATCH "^[a-z]+" kind "${name}")
+  set_tests_properties(${name} PROPERTIES LABELS "${kind}" TIMEOUT 600
+    ENVIRONMENT "GTEST_OUTPUT=xml:${CMAKE_BINARY_DIR}/test-results/${name}.xml;${T_ENV}")
+endfunction()
