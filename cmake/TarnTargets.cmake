@@ -33,6 +33,12 @@ if(TARN_SANITIZE)
   add_link_options(-fsanitize=${TARN_SANITIZE})
 endif()
 
+# What every test finds in its environment.
+set(TARN_TEST_ENV "")
+if(TARN_SANITIZE MATCHES "thread")
+  set(TARN_TEST_ENV "TSAN_OPTIONS=suppressions=${CMAKE_CURRENT_LIST_DIR}/thread_sanitizer.supp")
+endif()
+
 # Warnings for our own targets only, never for those who link us.
 function(tarn_warnings target)
   target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic -Wshadow -Wconversion
@@ -44,6 +50,7 @@ endfunction()
 
 # tarn_shared_library(TARGET OUTPUT_NAME EXPORT_NAME SOURCES...)
 # A shared library with the house's visibility and versioning, and the alias tarn::EXPORT_NAME.
+# A file exports.map in the target's folder is its linker version script: nothing else is shown.
 function(tarn_shared_library target output export)
   add_library(${target} SHARED ${ARGN})
   add_library(tarn::${export} ALIAS ${target})
@@ -52,6 +59,11 @@ function(tarn_shared_library target output export)
   target_link_options(${target} PRIVATE -Wl,--no-undefined -Wl,--as-needed)
   if(TARN_SANITIZE)
     set_property(TARGET ${target} PROPERTY LINK_OPTIONS "")
+  endif()
+  set(map "${CMAKE_CURRENT_SOURCE_DIR}/exports.map")
+  if(EXISTS "${map}")
+    target_link_options(${target} PRIVATE "LINKER:--version-script=${map}")
+    set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS "${map}")
   endif()
   tarn_warnings(${target})
 endfunction()
@@ -68,5 +80,5 @@ function(tarn_test name)
   add_test(NAME ${name} COMMAND ${name})
   string(REGEX MATCH "^[a-z]+" kind "${name}")
   set_tests_properties(${name} PROPERTIES LABELS "${kind}" TIMEOUT 600
-    ENVIRONMENT "GTEST_OUTPUT=xml:${CMAKE_BINARY_DIR}/test-results/${name}.xml;${T_ENV}")
+    ENVIRONMENT "GTEST_OUTPUT=xml:${CMAKE_BINARY_DIR}/test-results/${name}.xml;${TARN_TEST_ENV};${T_ENV}")
 endfunction()

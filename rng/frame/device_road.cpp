@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: Apache-2.0
+// The one submission of engines without device state.
+#include "frame/device_road.hpp"
+
+#include <cstring>
+
+namespace kestrel::tarn::rng::detail {
+
+sycl::event submit_with_snapshot(sycl::queue& queue, const std::vector<sycl::event>& dependencies,
+                                 rvx_stream stream, std::uint64_t words,
+                                 const kernel_launch& kernel) {
+  return queue.submit([&](sycl::handler& group) {
+    group.depends_on(dependencies);
+    alignas(8) unsigned char record[max_record_size];
+    std::memcpy(record, state_record(stream), kernel.record_size);
+    skip_stream(stream, words);
+    kernel.launch(group, kernel.context, record);
+  });
+}
+
+std::size_t work_items(std::int64_t n, std::int32_t per_item) {
+  const auto sum = static_cast<std::int64_t>(static_cast<std::uint64_t>(n) +
+                                             static_cast<std::uint64_t>(per_item - 1));
+  return static_cast<std::size_t>(sum / per_item);
+}
+
+}  // namespace kestrel::tarn::rng::detail

@@ -1,0 +1,133 @@
+// SPDX-License-Identifier: Apache-2.0
+// The frame of every generate call: verbose report around it, checks in a fixed order, then the
+// road by the device of the engine's queue, asked anew on each call.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <type_traits>
+#include <typeinfo>
+#include <vector>
+
+#include <kestrel/tarn/exceptions.hpp>
+#include <kestrel/tarn/rng/device_level.hpp>
+#include <kestrel/tarn/rng/generate.hpp>
+#include <sycl/sycl.hpp>
+
+#include "distributions/all.hpp"
+#include "frame/engine_backend.hpp"
+#include "frame/rows.hpp"
+#include "frame/verbose_call.hpp"
+
+namespace kestrel::tarn::rng::detail {
+
+/// Values that one result of `distr` fills: more than one for vectors and rows of counts.
+template <typename Distr>
+std::int64_t values_per_result(const Distr&) {
+  return 1;
+}
+template <typename T, matrix_layout layout, typename Method>
+std::int64_t values_per_result(const gaussian_mv<T, layout, Method>& distr) {
+  return distr.dimension();
+}
+template <typename T, typename Method>
+std::int64_t values_per_result(const multinomial<T, Method>& distr) {
+  return static_cast<std::int64_t>(distr.p().size());
+}
+
+/// Raise invalid_argument: "n" first, then "r". A buffer must hold every value that the call
+/// writes; how much stands behind a pointer nobody can tell.
+void check_output(std::int64_t n, const void* r);
+void check_output(std::int64_t n, std::size_t buffer_size, std::int64_t values_per_result);
+
+template <typename Distr, typename T>
+void check_output(const Distr&, std::int64_t n, T* r) {
+  check_output(n, r);
+}
+template <typename Distr, typename T>
+void check_output(const Distr& distr, std::int64_t n, sycl::buffer<T, 1>& r) {
+  check_output(n, r.size(), values_per_result(distr));
+}
+
+template <typename Distr>
+inline constexpr bool is_uniform_bits = false;
+template <typename UIntType>
+inline constexpr bool is_uniform_bits<uniform_bits<UIntType>> = true;
+
+/// True if the engine's words cannot give the distribution, whatever the device.
+template <typename Distr, typename Engine>
+inline constexpr bool is_refused = is_uniform_bits<Distr> && !engine_row<Engine>::uniform_bits;
+
+template <typename Engine>
+[[noreturn]] void refuse_uniform_bits() {
+  throw unimplemented("rng", "generate",
+                      std::string("uniform_bits distribution and ") + engine_row<Engine>::name +
+                          " engine combination");
+}
+
+/// `Out` is T* or sycl::buffer<T, 1>&.
+template <typename Distr, typename Engine, typename Out>
+sycl::event generate_on_device(const Distr& distr, Engine& engine, std::int64_t n, Out r,
+                               const std::vector<sycl::event>& dependencies) {
+  if constexpr (is_refused<Distr, Engine>) {
+    refuse_uniform_bits<Engine>();
+  } else {
+    using T = typename Distr::result_type;
+    check_output(distr, n, r);
+    sycl::queue& queue = engine.get_queue();
+    auto* impl = engine_access::impl(engine);
+    const sycl::device device = queue.get_device();
+    if (device.is_cpu()) {
+      using backend = engine_base_impl_backend<Engine, device_type::cpu>;
+      using distribution = distribution_impl<T, Distr, device_type::cpu>;
+      return static_cast<backend*>(impl)->template generate<T, distribution, Out>(
+          queue, n, r, distribution(distr), dependencies);
+    }
+    if constexpr (engine_row<Engine>::gpu) {
+      if (device.is_gpu()) {
+        if constexpr (distribution_row<Distr>::entry == device_entry::generate_ex) {
+          return gpu::generate_ex<Engine, Distr>(queue, distr, impl, n, r, dependencies).first;
+        } else {
+          return gpu::generate<Engine, Distr>(queue, distr, impl, n, r, dependencies);
+        }
+      }
+    }
+    throw unsupported_device("rng", "generate", device);
+  }
+}
+
+}  // namespace kestrel::tarn::rng::detail
+
+namespace kestrel::tarn::rng {
+
+template <typename Distr, typename Engine>
+sycl::event generate(const Distr& distr, Engine& engine, std::int64_t n,
+                     typename Distr::result_type* r, const std::vector<sycl::event>& dependencies) {
+  using T = typename Distr::result_type;
+  if (!detail::is_verbose()) {
+    return detail::generate_on_device<Distr, Engine, T*>(distr, engine, n, r, dependencies);
+  }
+  detail::verbose_call call(typeid(Distr), typeid(Engine), n, r, engine.get_queue());
+  call.start(dependencies);
+  sycl::event event =
+      detail::generate_on_device<Distr, Engine, T*>(distr, engine, n, r, dependencies);
+  call.finish(event);
+  return event;
+}
+
+template <typename Distr, typename Engine>
+void generate(const Distr& distr, Engine& engine, std::int64_t n,
+              sycl::buffer<typename Distr::result_type, 1>& r) {
+  using T = typename Distr::result_type;
+  using buffer = sycl::buffer<T, 1>&;
+  if (!detail::is_verbose()) {
+    detail::generate_on_device<Distr, Engine, buffer>(distr, engine, n, r, {});
+    return;
+  }
+  detail::verbose_call call(typeid(Distr), typeid(Engine), n, engine.get_queue());
+  call.start(r);
+  call.finish(detail::generate_on_device<Distr, Engine, buffer>(distr, engine, n, r, {}), r);
+}
+
+}  // namespace kestrel::tarn::rng

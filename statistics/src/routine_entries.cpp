@@ -1,0 +1,89 @@
+// SPDX-License-Identifier: Apache-2.0
+// The raw generation routines.
+#include "blocks.hpp"
+#include "distributions/uniform.hpp"
+#include "raw_entries.hpp"
+#include "stream.hpp"
+
+namespace {
+
+using namespace tarn::statistics;
+
+// The common head of every routine: checks method, stream, count and results in this order and
+// runs use(stream) if there is something to do. `flags` are the bits that the method may have.
+template <class Use>
+int routine(int method, int flags, void* stream, int n, const void* r, const Use& use) {
+  if ((method & ~flags) != 0)
+    return -1;
+  live_stream found;
+  if (const int status = find_stream(stream, found); status != RVX_STATUS_OK)
+    return status;
+  if (n < 0)
+    return -3;
+  if (n == 0)
+    return RVX_STATUS_OK;
+  if (r == nullptr)
+    return -4;
+  return use(found);
+}
+
+word_source source_of(const live_stream& stream) {
+  return {stream.engine->ops, stream.state()};
+}
+
+template <class Real>
+int uniform(int method, void* stream, int n, Real* r, Real a, Real b) {
+  return routine(method, RVX_RNG_METHOD_ACCURACY_FLAG, stream, n, r, [&](const live_stream& s) {
+    if (!(a < b))
+      return -5;
+    const bool accurate = (method & RVX_RNG_METHOD_ACCURACY_FLAG) != 0;
+    draw(source_of(s), static_cast<std::size_t>(n), 1, r, uniform_real<Real>{a, b, accurate});
+    return RVX_STATUS_OK;
+  });
+}
+
+// Values of `words_per_value` raw words each; little-endian, so the first word is the low half.
+int words(int method, void* stream, int n, void* r, std::size_t words_per_value,
+          bool equidistributed) {
+  return routine(method, 0, stream, n, r, [&](const live_stream& s) {
+    if (equidistributed && !s.engine->uniform_bits)
+      return RVX_STATUS_UNSUPPORTED;
+    draw(source_of(s), static_cast<std::size_t>(n) * words_per_value, 1,
+         static_cast<std::uint32_t*>(r), raw_words{});
+    return RVX_STATUS_OK;
+  });
+}
+
+static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "64-bit results are stored as two words");
+
+}  // namespace
+
+int _rvxsRngUniform(int method, void* stream, int n, float* r, float a, float b) {
+  return uniform(method, stream, n, r, a, b);
+}
+
+int _rvxdRngUniform(int method, void* stream, int n, double* r, double a, double b) {
+  return uniform(method, stream, n, r, a, b);
+}
+
+int _rvxiRngUniform(int method, void* stream, int n, std::int32_t* r, std::int32_t a,
+                    std::int32_t b) {
+  return routine(method, 0, stream, n, r, [&](const live_stream& s) {
+    if (a >= b)
+      return -5;
+    draw(source_of(s), static_cast<std::size_t>(n), 1, r, uniform_int32{a, b});
+    return RVX_STATUS_OK;
+  });
+}
+
+int _rvxiRngUniformBits(int method, void* stream, int n, std::uint32_t* r) {
+  return words(method, stream, n, r, 1, false);
+}
+
+int _rvxiRngUniformBits32(int method, void* stream, int n, std::uint32_t* r) {
+  return words(method, stream, n, r, 1, true);
+}
+
+int _rvxiRngUniformBits64(int method, void* stream, int n, std::uint64_t* r) {
+  return words(method, stream, n, r, 2, true);
+}

@@ -1,0 +1,130 @@
+// SPDX-License-Identifier: Apache-2.0
+// Reports of generate at levels 0, 1 and 2. The program sets the level itself and reads the file
+// that TARN_VERBOSE_OUTPUT_FILE names in its environment.
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <regex>
+#include <sstream>
+#include <string>
+#include <tarn_serv.h>
+#include <vector>
+
+#include <kestrel/tarn/rng.hpp>
+
+#include <gtest/gtest.h>
+
+#include "queues.hpp"
+
+namespace {
+
+namespace rng = kestrel::tarn::rng;
+
+std::string report_file() {
+  return std::getenv("TARN_VERBOSE_OUTPUT_FILE");
+}
+
+class report : public testing::Test {
+ protected:
+  void SetUp() override { std::remove(report_file().c_str()); }
+  void TearDown() override { *tarn_serv_verbose_mode() = 0; }
+
+  static void set_level(int level) { *tarn_serv_verbose_mode() = level; }
+
+  static sycl::queue profiled(const sycl::queue& queue) {
+    return sycl::queue(queue.get_device(), sycl::property::queue::enable_profiling{});
+  }
+
+  /// Lines that report a generate call.
+  static std::vector<std::string> lines() {
+    std::vector<std::string> found;
+    std::ifstream file(report_file());
+    for (std::string line; std::getline(file, line);) {
+      if (line.find("rng::generate") != std::string::npos) {
+        found.push_back(line);
+      }
+    }
+    return found;
+  }
+};
+
+TEST_F(report, level_0_prints_nothing) {
+  rng::philox4x32x10 engine(tarn_test::cpu_queue());
+  float value = 0;
+  rng::generate(rng::uniform<float>(), engine, 1, &value);
+  EXPECT_FALSE(std::ifstream(report_file()).good());
+}
+
+TEST_F(report, level_1_describes_a_usm_call_without_times) {
+  set_level(1);
+  rng::philox4x32x10 engine(tarn_test::cpu_queue());
+  std::vector<float> values(25);
+  rng::generate(rng::uniform<float>(), engine, 25, values.data());
+  ASSERT_EQ(lines().size(), 1u);
+  std::ostringstream expected;
+  expected << "TARN_VERBOSE kestrel::tarn::rng::generate USM call with parameters distribution = "
+              "kestrel::tarn::rng::uniform<float, kestrel::tarn::rng::uniform_method::standard>, "
+              "engine = kestrel::tarn::rng::philox4x32x10, n = 25, r = "
+           << static_cast<const void*>(values.data()) << " host:N/A device:N/A";
+  EXPECT_EQ(lines()[0], expected.str());
+}
+
+TEST_F(report, level_1_describes_a_buffer_call) {
+  set_level(1);
+  rng::philox4x32x10 engine(tarn_test::gpu_queue());
+  sycl::buffer<std::uint32_t, 1> buffer{sycl::range<1>(10)};
+  rng::generate(rng::bits<>(), engine, 9, buffer);
+  ASSERT_EQ(lines().size(), 1u);
+  EXPECT_EQ(lines()[0],
+            "TARN_VERBOSE kestrel::tarn::rng::generate Buffer call with parameters distribution = "
+            "kestrel::tarn::rng::bits<unsigned int>, engine = kestrel::tarn::rng::philox4x32x10, "
+            "n = 9 host:N/A device:N/A");
+}
+
+TEST_F(report, level_2_measures_host_and_device) {
+  set_level(2);
+  const std::regex timed(R"(.* host:[0-9.]+(ns|us|ms|s) device:[0-9.]+(ns|us|ms|s))");
+  for (const sycl::queue& queue : {tarn_test::cpu_queue(), tarn_test::gpu_queue()}) {
+    rng::philox4x32x10 engine(profiled(queue));
+    auto* values = sycl::malloc_shared<float>(10000, engine.get_queue());
+    const sycl::event before = engine.get_queue().fill(values, 0.0f, 10000);
+    rng::generate(rng::uniform<float>(), engine, 10000, values, {before});
+    sycl::buffer<float, 1> buffer{sycl::range<1>(10000)};
+    rng::generate(rng::uniform<float>(), engine, 10000, buffer);
+    sycl::free(values, engine.get_queue());
+  }
+  ASSERT_EQ(lines().size(), 4u);
+  for (const std::string& line : lines()) {
+    EXPECT_TRUE(std::regex_match(line, timed)) << line;
+  }
+}
+
+TEST_F(report, a_refused_call_prints_nothing_and_leaves_no_depth_behind) {
+  set_level(1);
+  rng::philox4x32x10 engine(tarn_test::cpu_queue());
+  float value = 0;
+  EXPECT_THROW(rng::generate(rng::uniform<float>(), engine, -1, &value),
+               kestrel::tarn::invalid_argument);
+  EXPECT_TRUE(lines().empty());
+  rng::generate(rng::uniform<float>(), engine, 1, &value);
+  EXPECT_EQ(lines().size(), 1u);
+}
+
+TEST_F(report, values_do_not_depend_on_the_level) {
+  std::vector<std::vector<float>> drawn;
+  for (int level = 0; level <= 2; ++level) {
+    set_level(level);
+    rng::philox4x32x10 engine(profiled(tarn_test::gpu_queue()), 5);
+    std::vector<float> values(100);
+    {
+      sycl::buffer<float, 1> buffer(values.data(), sycl::range<1>(100));
+      rng::generate(rng::uniform<float>(), engine, 100, buffer);
+    }
+    drawn.push_back(values);
+  }
+  EXPECT_EQ(drawn[0], drawn[1]);
+  EXPECT_EQ(drawn[0], drawn[2]);
+}
+
+}  // namespace

@@ -1,0 +1,232 @@
+// SPDX-License-Identifier: Apache-2.0
+// Every bad argument of the public functions: its status, its report, and nothing written. The raw
+// entries, called without the checks in front, refuse the same.
+#include <cmath>
+#include <limits>
+
+#include "support.hpp"
+
+namespace {
+
+using list = support::reports::list;
+constexpr std::int64_t above_int = std::int64_t{1} << 31;
+
+// A stream whose mark was damaged, mended before it is deleted.
+class unmarked {
+ public:
+  unmarked() { mark() = 0; }
+  ~unmarked() { mark() = 1; }
+  operator rvx_stream() const { return stream_; }
+
+ private:
+  std::uint8_t& mark() { return static_cast<std::uint8_t*>(rvx_stream(stream_))[4]; }
+  support::stream stream_;
+};
+
+class arguments : public testing::Test {
+ protected:
+  // The call returned `status` and reported `position` of `name`, once.
+  void expect(int returned, int status, const char* name, int position) {
+    EXPECT_EQ(returned, status) << name;
+    EXPECT_EQ(reports_.take(), (list{{name, position}}));
+  }
+
+  // The head that all routines share; `draw(method, stream, n, r)` is one of them.
+  template <class Value, class Draw>
+  void check_head(const char* name, const Draw& draw) {
+    support::results<Value> r(4);
+    const support::record before = stream_.state();
+    expect(draw(-1, stream_, 4, r.data()), -1, name, 1);
+    expect(draw(std::int64_t{1} << 32, stream_, 4, r.data()), -1, name, 1);
+    expect(draw(1, stream_, 4, r.data()), -1, name, 1);
+    expect(draw(0, nullptr, 4, r.data()), -5, name, 2);
+    expect(draw(0, unmarked_, 4, r.data()), -1006, name, 2);
+    expect(draw(0, stream_, -1, r.data()), -3, name, 3);
+    expect(draw(0, stream_, 4, static_cast<Value*>(nullptr)), -4, name, 4);
+    // In the order of the arguments: the first bad one is reported.
+    expect(draw(-1, nullptr, -1, static_cast<Value*>(nullptr)), -1, name, 1);
+    expect(draw(0, nullptr, -1, static_cast<Value*>(nullptr)), -5, name, 2);
+    expect(draw(0, stream_, -1, static_cast<Value*>(nullptr)), -3, name, 3);
+    EXPECT_EQ(draw(0, stream_, 0, static_cast<Value*>(nullptr)), 0);
+    EXPECT_EQ(draw(1, stream_, 0, static_cast<Value*>(nullptr)), 0) << "checked before n = 0";
+    EXPECT_TRUE(reports_.take().empty());
+    const support::record after = stream_.state();
+    EXPECT_EQ(std::memcmp(&before, &after, sizeof before), 0);
+    EXPECT_TRUE(r.untouched());
+  }
+
+  support::reports reports_;
+  support::stream stream_;
+  unmarked unmarked_;
+};
+
+TEST_F(arguments, heads_of_the_routines) {
+  check_head<float>("rvxsRngUniform", [](std::int64_t m, rvx_stream s, std::int64_t n, float* r) {
+    return rvxsRngUniform(m, s, n, r, 0, 1);
+  });
+  check_head<double>("rvxdRngUniform", [](std::int64_t m, rvx_stream s, std::int64_t n, double* r) {
+    return rvxdRngUniform(m, s, n, r, 0, 1);
+  });
+  check_head<std::int32_t>("rvxiRngUniform",
+                           [](std::int64_t m, rvx_stream s, std::int64_t n, std::int32_t* r) {
+                             return rvxiRngUniform(m, s, n, r, 0, 6);
+                           });
+  check_head<std::uint32_t>("rvxiRngUniformBits", rvxiRngUniformBits);
+  check_head<std::uint32_t>("rvxiRngUniformBits32", rvxiRngUniformBits32);
+  check_head<std::uint64_t>("rvxiRngUniformBits64", rvxiRngUniformBits64);
+}
+
+TEST_F(arguments, bounds_of_uniform) {
+  constexpr double nan = std::numeric_limits<double>::quiet_NaN();
+  support::results<float> f(4);
+  support::results<double> d(4);
+  support::results<std::int32_t> i(4);
+  expect(rvxsRngUniform(0, stream_, 4, f.data(), 1, 1), -5, "rvxsRngUniform", 5);
+  expect(rvxsRngUniform(0, stream_, 4, f.data(), 2, 1), -5, "rvxsRngUniform", 5);
+  expect(rvxdRngUniform(0, stream_, 4, d.data(), 1, 1), -5, "rvxdRngUniform", 5);
+  expect(rvxdRngUniform(0, stream_, 4, d.data(), nan, 1), -5, "rvxdRngUniform", 5);
+  expect(rvxdRngUniform(0, stream_, 4, d.data(), 0, nan), -5, "rvxdRngUniform", 5);
+  expect(rvxiRngUniform(0, stream_, 4, i.data(), 3, 3), -5, "rvxiRngUniform", 5);
+  // Bounds are looked at before the bits of the method.
+  expect(rvxsRngUniform(2, stream_, 4, f.data(), 1, 1), -5, "rvxsRngUniform", 5);
+  expect(rvxsRngUniform(0x40000001, stream_, 4, f.data(), 0, 1), -1, "rvxsRngUniform", 1);
+  expect(rvxdRngUniform(0x140000000, stream_, 4, d.data(), 0, 1), -1, "rvxdRngUniform", 1);
+  EXPECT_EQ(rvxsRngUniform(0, stream_, 0, nullptr, 1, 1), 0);
+  EXPECT_TRUE(f.untouched() && d.untouched() && i.untouched());
+}
+
+TEST_F(arguments, making_streams) {
+  rvx_stream made = &made;  // a value that must survive
+  const rvx_stream before = made;
+  const std::uint32_t seed = 1;
+  expect(rvxNewStream(nullptr, RVX_BRNG_PHILOX4X32X10, 1), -5, "rvxNewStream", 1);
+  expect(rvxNewStream(&made, -1, 1), -1000, "rvxNewStream", 2);
+  expect(rvxNewStream(&made, above_int, 1), -1000, "rvxNewStream", 2);
+  expect(rvxNewStream(&made, 0, 1), -1000, "rvxNewStream", 2);
+  expect(rvxNewStream(&made, 0x12300000, 1), -1000, "rvxNewStream", 2);
+  expect(rvxNewStream(&made, RVX_BRNG_PHILOX4X32X10 + 1, 1), -1000, "rvxNewStream", 2);
+  expect(rvxNewStreamEx(nullptr, RVX_BRNG_PHILOX4X32X10, 1, &seed), -5, "rvxNewStreamEx", 1);
+  expect(rvxNewStreamEx(&made, above_int, 1, &seed), -1000, "rvxNewStreamEx", 2);
+  expect(rvxNewStreamEx(&made, 0x12300000, 1, &seed), -1000, "rvxNewStreamEx", 2);
+  expect(rvxNewStreamEx(&made, RVX_BRNG_PHILOX4X32X10, -1, &seed), -3, "rvxNewStreamEx", 3);
+  expect(rvxNewStreamEx(&made, RVX_BRNG_PHILOX4X32X10, above_int, &seed), -3, "rvxNewStreamEx", 3);
+  expect(rvxNewStreamEx(&made, RVX_BRNG_PHILOX4X32X10, 1, nullptr), -4, "rvxNewStreamEx", 4);
+  EXPECT_EQ(made, before);
+}
+
+TEST_F(arguments, stream_services) {
+  std::uint8_t image[64] = {};
+  const std::uint64_t digit = 1;
+  rvx_stream made = nullptr, none = nullptr, bad = unmarked_;
+  expect(rvxDeleteStream(nullptr), -5, "rvxDeleteStream", 1);
+  expect(rvxDeleteStream(&none), -5, "rvxDeleteStream", 1);
+  expect(rvxDeleteStream(&bad), -1006, "rvxDeleteStream", 1);
+  expect(rvxCopyStream(nullptr, stream_), -5, "rvxCopyStream", 1);
+  expect(rvxCopyStream(&made, nullptr), -5, "rvxCopyStream", 2);
+  expect(rvxCopyStream(&made, unmarked_), -1006, "rvxCopyStream", 2);
+  expect(rvxSkipAheadStream(nullptr, 1), -5, "rvxSkipAheadStream", 1);
+  expect(rvxSkipAheadStream(unmarked_, 1), -1006, "rvxSkipAheadStream", 1);
+  expect(rvxSkipAheadStreamEx(nullptr, 1, &digit), -5, "rvxSkipAheadStreamEx", 1);
+  expect(rvxSkipAheadStreamEx(unmarked_, 1, &digit), -1006, "rvxSkipAheadStreamEx", 1);
+  expect(rvxSkipAheadStreamEx(stream_, -1, &digit), -2, "rvxSkipAheadStreamEx", 2);
+  expect(rvxSkipAheadStreamEx(stream_, above_int, &digit), -2, "rvxSkipAheadStreamEx", 2);
+  expect(rvxSkipAheadStreamEx(stream_, 1, nullptr), -3, "rvxSkipAheadStreamEx", 3);
+  expect(rvxLeapfrogStream(nullptr, 0, 2), -5, "rvxLeapfrogStream", 1);
+  expect(rvxLeapfrogStream(unmarked_, 0, 2), -1006, "rvxLeapfrogStream", 1);
+  expect(rvxLeapfrogStream(stream_, -1, 2), -2, "rvxLeapfrogStream", 2);
+  expect(rvxLeapfrogStream(stream_, 0, 0), -3, "rvxLeapfrogStream", 3);
+  expect(rvxLeapfrogStream(stream_, 0, 2), RVX_STATUS_UNSUPPORTED, "rvxLeapfrogStream", 1);
+  expect(rvxGetStreamSize(nullptr), -5, "rvxGetStreamSize", 1);
+  expect(rvxGetStreamSize(unmarked_), -1006, "rvxGetStreamSize", 1);
+  expect(rvxSaveStreamM(nullptr, image), -5, "rvxSaveStreamM", 1);
+  expect(rvxSaveStreamM(unmarked_, image), -1006, "rvxSaveStreamM", 1);
+  expect(rvxSaveStreamM(stream_, nullptr), -2, "rvxSaveStreamM", 2);
+  expect(rvxLoadStreamM(nullptr, image), -5, "rvxLoadStreamM", 1);
+  expect(rvxLoadStreamM(&made, nullptr), -2, "rvxLoadStreamM", 2);
+  expect(rvxSaveStreamF(nullptr, "x", -1), -5, "rvxSaveStreamF", 1);
+  expect(rvxSaveStreamF(unmarked_, "x", -1), -1006, "rvxSaveStreamF", 1);
+  expect(rvxSaveStreamF(stream_, nullptr, -1), -2, "rvxSaveStreamF", 2);
+  expect(rvxSaveStreamF(stream_, "x", -2), -3, "rvxSaveStreamF", 3);
+  expect(rvxLoadStreamF(nullptr, "x", -1), -5, "rvxLoadStreamF", 1);
+  expect(rvxLoadStreamF(&made, nullptr, -1), -2, "rvxLoadStreamF", 2);
+  expect(rvxLoadStreamF(&made, "x", -2), -3, "rvxLoadStreamF", 3);
+  EXPECT_EQ(made, nullptr);
+}
+
+TEST(streams, copies_go_on_independently) {
+  support::stream original(9);
+  std::uint32_t a[7], b[7], c[7];
+  ASSERT_EQ(rvxiRngUniformBits(0, original, 3, a), 0);
+  rvx_stream copy = nullptr;
+  ASSERT_EQ(rvxCopyStream(&copy, original), 0);
+  ASSERT_EQ(rvxiRngUniformBits(0, copy, 7, b), 0);
+  ASSERT_EQ(rvxiRngUniformBits(0, original, 7, c), 0);
+  EXPECT_TRUE(std::equal(b, b + 7, c));
+  EXPECT_EQ(rvxDeleteStream(&copy), 0);
+  EXPECT_EQ(copy, nullptr);
+}
+
+// A record that no engine function may run on is refused, not followed.
+TEST(streams, impossible_states_are_refused) {
+  support::stream s;
+  support::record r = s.state();
+  r.idx = 5;
+  s.set(r);
+  support::results<std::uint32_t> out(4);
+  rvx_stream copy = nullptr;
+  std::uint8_t image[64];
+  EXPECT_EQ(rvxiRngUniformBits(0, s, 4, out.data()), RVX_STATUS_BAD_MARK);
+  EXPECT_EQ(rvxSaveStreamM(s, image), RVX_STATUS_BAD_MARK);
+  EXPECT_EQ(rvxGetStreamSize(s), RVX_STATUS_BAD_MARK);
+  const support::reports quiet;
+  EXPECT_EQ(rvxSkipAheadStream(s, 1), RVX_STATUS_BAD_MARK);
+  EXPECT_EQ(rvxCopyStream(&copy, s), RVX_STATUS_BAD_MARK);
+  EXPECT_TRUE(out.untouched());
+  EXPECT_EQ(copy, nullptr);
+}
+
+TEST(raw_entries, are_safe_without_the_checks_in_front) {
+  support::stream s;
+  const unmarked bad;
+  support::results<float> f(4);
+  support::results<std::uint64_t> w(4);
+  void* made = nullptr;
+  std::uint8_t image[64] = {};
+  EXPECT_EQ(_rvxsRngUniform(3, s, 4, f.data(), 0, 1), -1);
+  EXPECT_EQ(_rvxsRngUniform(0, nullptr, 4, f.data(), 0, 1), -5);
+  EXPECT_EQ(_rvxsRngUniform(0, bad, 4, f.data(), 0, 1), -1006);
+  EXPECT_EQ(_rvxsRngUniform(0, s, -4, f.data(), 0, 1), -3);
+  EXPECT_EQ(_rvxsRngUniform(0, s, 4, nullptr, 0, 1), -4);
+  EXPECT_EQ(_rvxsRngUniform(0, s, 4, f.data(), 1, 1), -5);
+  EXPECT_EQ(_rvxsRngUniform(0, s, 4, f.data(), NAN, 1), -5);
+  EXPECT_EQ(_rvxiRngUniformBits64(-1, s, 4, w.data()), -1);
+  EXPECT_EQ(_rvxiRngUniformBits64(0, s, -1, w.data()), -3);
+  EXPECT_EQ(_rvxiRngUniformBits64(0, s, 1, nullptr), -4);
+  EXPECT_EQ(__rvxNewStreamEx(nullptr, RVX_BRNG_PHILOX4X32X10, 0, nullptr), -5);
+  EXPECT_EQ(__rvxNewStreamEx(&made, -1, 0, nullptr), -1000);
+  EXPECT_EQ(__rvxNewStreamEx(&made, RVX_BRNG_PHILOX4X32X10, -1, nullptr), -3);
+  EXPECT_EQ(__rvxNewStreamEx(&made, RVX_BRNG_PHILOX4X32X10, 2, nullptr), -4);
+  EXPECT_EQ(__rvxDeleteStream(nullptr), -5);
+  EXPECT_EQ(__rvxDeleteStream(&made), -5);
+  EXPECT_EQ(__rvxCopyStream(nullptr, s), -5);
+  EXPECT_EQ(__rvxCopyStream(&made, bad), -1006);
+  EXPECT_EQ(__rvxSkipAheadStream(bad, 1), -1006);
+  EXPECT_EQ(__rvxSkipAheadStreamEx(s, -1, nullptr), -2);
+  EXPECT_EQ(__rvxSkipAheadStreamEx(s, 1, nullptr), -3);
+  EXPECT_EQ(__rvxSkipAheadStreamEx(s, 0, nullptr), 0);
+  EXPECT_EQ(__rvxLeapfrogStream(s, 0, 2), RVX_STATUS_UNSUPPORTED);
+  EXPECT_EQ(__rvxGetStreamSize(nullptr), -5);
+  EXPECT_EQ(__rvxSaveStreamM(s, nullptr), -2);
+  EXPECT_EQ(__rvxSaveStreamM(nullptr, image), -5);
+  EXPECT_EQ(__rvxLoadStreamM(nullptr, image), -5);
+  EXPECT_EQ(__rvxLoadStreamM(&made, nullptr), -2);
+  EXPECT_EQ(__rvxLoadStreamM(&made, image), RVX_STATUS_BAD_IMAGE);
+  EXPECT_EQ(__rvxSaveStreamF(s, nullptr, -1), -2);
+  EXPECT_EQ(__rvxSaveStreamF(s, "x", -2), -3);
+  EXPECT_EQ(__rvxLoadStreamF(nullptr, "x", -1), -5);
+  EXPECT_EQ(__rvxLoadStreamF(&made, "x", -7), -3);
+  EXPECT_EQ(made, nullptr);
+  EXPECT_TRUE(f.untouched() && w.untouched());
+}
+
+}  // namespace
