@@ -1,10 +1,10 @@
 # SPDX-License-Identifier: Apache-2.0
 # Proves that no #include goes against the arrows between the subsystems:
 #   cmake -DROOT=<tree> -P cmake/check_includes.cmake
-# The two tables below are the rule. A folder may always open its own files, tests/<folder> may
-# open what it tests, and lists (.def) are data that everyone may read. Includes are resolved by
-# name over the whole tree, without the compiler's search paths; when a name could mean several
-# files of other folders, each of them has to be allowed.
+# The two tables below are the rule. A folder may always open its own files, tests/<folder> and
+# bench/<folder> may open what they test and measure, and lists (.def) are data that everyone may
+# read. Includes are resolved by name over the whole tree, without the compiler's search paths;
+# when a name could mean several files of other folders, each of them has to be allowed.
 cmake_minimum_required(VERSION 3.25)
 include("${CMAKE_CURRENT_LIST_DIR}/house_files.cmake")
 
@@ -35,7 +35,7 @@ function(may_open out from spelled to)
   string(REGEX REPLACE "/.*" "" from_folder "${from}")
   string(REGEX REPLACE "/.*" "" to_folder "${to}")
   set(${out} TRUE PARENT_SCOPE)
-  if(from_folder STREQUAL to_folder OR to MATCHES "\\.def$" OR from MATCHES "^tests/${to_folder}/")
+  if(from_folder STREQUAL to_folder OR to MATCHES "\\.def$" OR from MATCHES "^(tests|bench)/${to_folder}/")
     return()
   endif()
   # lumen stands in for any SYCL, so it is reached by the standard's names alone.
@@ -54,7 +54,7 @@ endfunction()
 
 # find_included(OUT FROM_FILE SPELLED): the files of the tree that SPELLED can mean; empty for a
 # header of the system. A file beside the including one, or else of its folder
-# (or of the folder that it tests), goes first.
+# (or of the folder that it tests or measures), goes first.
 function(find_included out from spelled)
   string(REGEX REPLACE "^.(.*).$" "\\1" path "${spelled}")
   get_filename_component(name "${path}" NAME)
@@ -77,8 +77,8 @@ function(find_included out from spelled)
     list(FILTER found INCLUDE REGEX "(^|/)${tail}$")
   endif()
   string(REGEX REPLACE "/.*" "" own_folder "${from}")
-  if(from MATCHES "^tests/([^/]+)/")
-    set(own_folder "(tests|${CMAKE_MATCH_1})")
+  if(from MATCHES "^(tests|bench)/([^/]+)/")
+    set(own_folder "(${CMAKE_MATCH_1}|${CMAKE_MATCH_2})")
   endif()
   set(own ${found})
   list(FILTER own INCLUDE REGEX "^${own_folder}/")

@@ -40,6 +40,7 @@ void add(const std::string& name, std::size_t n,
       ->UseRealTime()
       ->MinTime(0.1)
       ->Repetitions(repetitions)
+      ->ReportAggregatesOnly()
       ->Unit(benchmark::kMillisecond);
 }
 
@@ -98,21 +99,20 @@ void add_peers() {
 }
 
 void print_ratios(const ratio_reporter& r) {
-  std::printf("\nQuotients of the median rates (values per second)\n");
+  std::printf("\nQuotients of the median rates (bytes per second)\n");
   r.print_ratio("rvx/float", "random123/float", 2.0);
   r.print_ratio("rvx/float", "std_mt19937/float", 6.0);
   for (const char* peer : {"random123", "std_mt19937", "boost_mt19937"})
     for (const char* kind : {"words", "float", "double"})
-      r.print_ratio(std::string("rvx/") + kind, std::string(peer) + "/" + kind, 0);
+      r.print_ratio(std::string("rvx/") + kind, std::string(peer) + "/" + kind);
   for (const char* kind : {"words", "float", "double"}) {
     const std::string name = std::string("rvx/") + kind + "/large/";
-    r.print_ratio(name + "2threads", name + "1thread", 1.8);
+    r.print_ratio(name + "2threads", name + "1thread", 1.8, "memset/large/2threads");
   }
-  // Against memset of the same number of bytes; a double has twice the bytes of a float.
   for (const char* threads : {"1thread", "2threads"})
     for (const char* kind : {"words", "float", "double"})
       r.print_ratio(std::string("rvx/") + kind + "/large/" + threads,
-                    std::string("memset/large/") + threads, 0);
+                    std::string("memset/large/") + threads);
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A console reporter that keeps the rates of all runs and can print their quotients: times of one
+// A console reporter that keeps the median rates and can print their quotients: times of one
 // machine mean little to another, quotients of one run do.
 #pragma once
 
@@ -13,12 +13,14 @@ class ratio_reporter : public benchmark::ConsoleReporter {
  public:
   void ReportRuns(const std::vector<Run>& runs) override;
 
-  // Median rate of a benchmark (values per second), or 0 if it did not run.
+  // Median rate of a benchmark (bytes per second), or 0 if it did not run.
   double rate(const std::string& name) const;
 
-  // One line: the quotient of two median rates, and the one that is asked for (0: none is).
-  void print_ratio(const std::string& of, const std::string& to, double asked) const;
+  // One line: the quotient of two median rates, and whether it is what is asked for (0: nothing
+  // is). Reaching the rate of `ceiling` will do as well.
+  void print_ratio(const std::string& of, const std::string& to, double asked = 0,
+                   const std::string& ceiling = "") const;
 
  private:
-  std::map<std::string, std::vector<double>> rates_;
+  std::map<std::string, double> rates_;
 };

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The two channels that the core prints to.
-#ifndef TARN_CORE_CHANNEL_HPP
-#define TARN_CORE_CHANNEL_HPP
+#pragma once
 
 #include <cstdio>
 
@@ -14,5 +13,3 @@ inline std::FILE* stream_of(int which) {
 }
 
 }  // namespace tarn::core
-
-#endif

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The settings of the core as constants, one for each row of settings.def, and how they are read.
-#ifndef TARN_CORE_SETTINGS_HPP
-#define TARN_CORE_SETTINGS_HPP
+#pragma once
 
 namespace tarn::core {
 
@@ -34,5 +33,3 @@ int read(const integer_setting& setting);
 const char* read(const text_setting& setting);
 
 }  // namespace tarn::core
-
-#endif

@@ -167,4 +167,23 @@ TEST(FunctionObjects, TypedAndTransparent) {
   EXPECT_EQ((sycl::plus<std::int8_t>()(std::int8_t{100}, std::int8_t{27})), 127);
 }
 
+TEST(FunctionObjects, IdentitiesLeaveValuesAsTheyAre) {
+  const auto keeps = [](auto operation, auto value) {
+    using T = decltype(value);
+    static_assert(sycl::has_known_identity_v<decltype(operation), T>);
+    const T identity = sycl::known_identity_v<decltype(operation), T>;
+    return operation(value, identity) == value && operation(identity, value) == value;
+  };
+  EXPECT_TRUE(keeps(sycl::plus<>(), 7));
+  EXPECT_TRUE(keeps(sycl::multiplies<double>(), 2.5));
+  EXPECT_TRUE(keeps(sycl::bit_and<std::int8_t>(), std::int8_t{-77}));
+  EXPECT_TRUE(keeps(sycl::bit_or<>(), 5U));
+  EXPECT_TRUE(keeps(sycl::bit_xor<>(), 5U));
+  EXPECT_TRUE(keeps(sycl::minimum<>(), std::numeric_limits<float>::infinity()));
+  EXPECT_TRUE(keeps(sycl::maximum<>(), std::numeric_limits<long>::min()));
+  static_assert(!sycl::has_known_identity_v<sycl::bit_and<>, float>);
+  static_assert(!sycl::has_known_identity_v<sycl::plus<int>, float>);
+  static_assert(!sycl::has_known_identity_v<sycl::logical_and<>, int>);
+}
+
 }  // namespace

@@ -91,4 +91,26 @@ TEST(VecMemory, LoadAndStoreCountWholeVecsAndNeedNoAlignment) {
   EXPECT_EQ(three.x(), 3.0F);
 }
 
+TEST(VecMemory, MultiPtrsOfEitherDecorationWork) {
+  using space = sycl::access::address_space;
+  using decorated = sycl::access::decorated;
+  float memory[8] = {0, 1, 2, 3, 4, 5, 6, 7};
+  const float* const read_only = memory;
+  const auto raw = sycl::address_space_cast<space::global_space, decorated::no>(memory);
+  const auto marked = sycl::address_space_cast<space::global_space, decorated::yes>(read_only);
+  sycl::float4 v;
+  v.load(1, marked);
+  EXPECT_EQ(v.x(), 4.0F);
+  (v + 1).store(0, raw);
+  EXPECT_EQ(memory[3], 8.0F);
+  v.odd().store(3, raw);
+  EXPECT_EQ(memory[6], 5.0F);
+  v.odd().load(0, raw);
+  EXPECT_EQ(v.w(), 6.0F);
+  int exponent = 0;
+  const auto place = sycl::address_space_cast<space::private_space, decorated::no>(&exponent);
+  EXPECT_EQ(sycl::frexp(8.0F, place), 0.5F);
+  EXPECT_EQ(exponent, 4);
+}
+
 }  // namespace

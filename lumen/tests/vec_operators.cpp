@@ -120,10 +120,13 @@ TYPED_TEST(VecOperators, ComparisonsGiveSignedMasksOfTheSameSize) {
   LUMEN_TEST_COMPARISON(>);
   LUMEN_TEST_COMPARISON(<=);
   LUMEN_TEST_COMPARISON(>=);
-  LUMEN_TEST_COMPARISON(&&);
-  LUMEN_TEST_COMPARISON(||);
+  // The logical operators take zero as false.
+  const mask both = a && b;
+  const mask either = a || T(0);
   const mask negated = !a;
   for (int i = 0; i < 8; ++i) {
+    EXPECT_EQ(both[i], a[i] != T(0) && b[i] != T(0) ? -1 : 0);
+    EXPECT_EQ(either[i], a[i] != T(0) ? -1 : 0);
     EXPECT_EQ(negated[i], a[i] == T(0) ? -1 : 0);
   }
 }

@@ -16,55 +16,12 @@
 #include <sycl/sycl.hpp>
 
 #include "distributions/all.hpp"
+#include "frame/checks.hpp"
 #include "frame/engine_backend.hpp"
 #include "frame/rows.hpp"
 #include "frame/verbose_call.hpp"
 
 namespace kestrel::tarn::rng::detail {
-
-/// Values that one result of `distr` fills: more than one for vectors and rows of counts.
-template <typename Distr>
-std::int64_t values_per_result(const Distr&) {
-  return 1;
-}
-template <typename T, matrix_layout layout, typename Method>
-std::int64_t values_per_result(const gaussian_mv<T, layout, Method>& distr) {
-  return distr.dimension();
-}
-template <typename T, typename Method>
-std::int64_t values_per_result(const multinomial<T, Method>& distr) {
-  return static_cast<std::int64_t>(distr.p().size());
-}
-
-/// Raise invalid_argument: "n" first, then "r". A buffer must hold every value that the call
-/// writes; how much stands behind a pointer nobody can tell.
-void check_output(std::int64_t n, const void* r);
-void check_output(std::int64_t n, std::size_t buffer_size, std::int64_t values_per_result);
-
-template <typename Distr, typename T>
-void check_output(const Distr&, std::int64_t n, T* r) {
-  check_output(n, r);
-}
-template <typename Distr, typename T>
-void check_output(const Distr& distr, std::int64_t n, sycl::buffer<T, 1>& r) {
-  check_output(n, r.size(), values_per_result(distr));
-}
-
-template <typename Distr>
-inline constexpr bool is_uniform_bits = false;
-template <typename UIntType>
-inline constexpr bool is_uniform_bits<uniform_bits<UIntType>> = true;
-
-/// True if the engine's words cannot give the distribution, whatever the device.
-template <typename Distr, typename Engine>
-inline constexpr bool is_refused = is_uniform_bits<Distr> && !engine_row<Engine>::uniform_bits;
-
-template <typename Engine>
-[[noreturn]] void refuse_uniform_bits() {
-  throw unimplemented("rng", "generate",
-                      std::string("uniform_bits distribution and ") + engine_row<Engine>::name +
-                          " engine combination");
-}
 
 /// `Out` is T* or sycl::buffer<T, 1>&.
 template <typename Distr, typename Engine, typename Out>

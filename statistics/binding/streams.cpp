@@ -4,9 +4,9 @@
 
 #include "checks.hpp"
 #include "entry.hpp"
+#include "stream_verbose.hpp"
 #include "tarn_rvx.h"
 #include "tarn_serv.h"
-#include "verbose.hpp"
 
 namespace {
 

@@ -10,6 +10,10 @@
  *
  * Generation: for one seed the values never depend on the processor, on its SIMD width, on the
  * number of threads, or on how a sequence is cut into calls.
+ *
+ * Environment: TARN_NUM_THREADS, the most threads that one call may use (large calls share their
+ * work out); TARN_SIMD_TARGET, the instruction set of the kernels by its Highway name (AVX3, AVX2,
+ * SSE4, SSSE3, SCALAR; default: best), for tests and comparisons.
  */
 #ifndef TARN_RVX_H
 #define TARN_RVX_H
@@ -44,7 +48,7 @@ typedef void *rvx_stream;
 #define RVX_STATUS_OK 0
 #define RVX_STATUS_NULL_STREAM (-5)
 #define RVX_STATUS_BAD_CODE (-1000)   /* no engine of that code, or bad seed words */
-#define RVX_STATUS_BAD_MARK (-1006)   /* not a stream, or one that was deleted */
+#define RVX_STATUS_BAD_MARK (-1006)   /* not a stream, one that was deleted, or an impossible state */
 #define RVX_STATUS_NO_MEMORY (-1001)
 #define RVX_STATUS_UNSUPPORTED (-1002) /* the engine has no such service */
 #define RVX_STATUS_NO_ENTRY (-1003)    /* the library or an entry is missing, and an exit hook of
@@ -93,7 +97,9 @@ RVX_API int rvxLoadStreamF(rvx_stream *stream, const char *name, int length);
 /* Generation. Common head: method code, stream, number of results (0 or more), results; then
  * the distribution's parameters. */
 
-/* Uniform on [a, b), a < b: the word-to-real rule of the engine, one word for one result. */
+/* Uniform on [a, b), a < b: the word-to-real rule of the engine, one word for one result. The
+ * values b - a and a + b are taken in the type of the results and must be finite. Rounding may
+ * deliver b itself; with the accuracy flag no result lies outside [a, b]. */
 RVX_API int rvxsRngUniform(int64_t method, rvx_stream stream, int64_t n, float *r, float a,
                            float b);
 RVX_API int rvxdRngUniform(int64_t method, rvx_stream stream, int64_t n, double *r, double a,

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The raw generation routines.
+#include <exception>
+
 #include "blocks.hpp"
 #include "distributions/uniform.hpp"
 #include "raw_entries.hpp"
@@ -24,7 +26,12 @@ int routine(int method, int flags, void* stream, int n, const void* r, const Use
     return RVX_STATUS_OK;
   if (r == nullptr)
     return -4;
-  return use(found);
+  try {
+    return use(found);
+  } catch (const std::exception&) {
+    // Sharing out the work found no memory or no threads. The stream has not moved.
+    return RVX_STATUS_NO_MEMORY;
+  }
 }
 
 word_source source_of(const live_stream& stream) {
@@ -42,19 +49,16 @@ int uniform(int method, void* stream, int n, Real* r, Real a, Real b) {
   });
 }
 
-// Values of `words_per_value` raw words each; little-endian, so the first word is the low half.
-int words(int method, void* stream, int n, void* r, std::size_t words_per_value,
-          bool equidistributed) {
+template <class Value>
+int words(int method, void* stream, int n, Value* r, bool equidistributed) {
   return routine(method, 0, stream, n, r, [&](const live_stream& s) {
     if (equidistributed && !s.engine->uniform_bits)
       return RVX_STATUS_UNSUPPORTED;
-    draw(source_of(s), static_cast<std::size_t>(n) * words_per_value, 1,
-         static_cast<std::uint32_t*>(r), raw_words{});
+    using producer = raw_words<Value>;
+    draw(source_of(s), static_cast<std::size_t>(n), producer::words_per_value, r, producer{});
     return RVX_STATUS_OK;
   });
 }
-
-static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "64-bit results are stored as two words");
 
 }  // namespace
 
@@ -77,13 +81,13 @@ int _rvxiRngUniform(int method, void* stream, int n, std::int32_t* r, std::int32
 }
 
 int _rvxiRngUniformBits(int method, void* stream, int n, std::uint32_t* r) {
-  return words(method, stream, n, r, 1, false);
+  return words(method, stream, n, r, false);
 }
 
 int _rvxiRngUniformBits32(int method, void* stream, int n, std::uint32_t* r) {
-  return words(method, stream, n, r, 1, true);
+  return words(method, stream, n, r, true);
 }
 
 int _rvxiRngUniformBits64(int method, void* stream, int n, std::uint64_t* r) {
-  return words(method, stream, n, r, 2, true);
+  return words(method, stream, n, r, true);
 }

@@ -13,7 +13,7 @@
 #include <gtest/gtest.h>
 
 #include "drawing.hpp"
-#include "frame/generate.hpp"
+#include "frame/checks.hpp"
 #include "message.hpp"
 #include "queues.hpp"
 

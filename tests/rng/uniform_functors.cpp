@@ -31,7 +31,7 @@ TEST(uniform_std, clamps_to_both_bounds_if_accurate) {
 
 TEST(uniform_std, integers_are_floors_and_ignore_the_byte) {
   const sycl::vec<double, 4> x(-1.5, -0.25, 0.75, 12.0);
-  for (const std::uint8_t accurate : {0, 1}) {
+  for (const std::uint8_t accurate : {std::uint8_t{0}, std::uint8_t{1}}) {
     const auto values = gpu::uniform_std<std::int32_t, double>{0.0, 1.0, accurate}(x);
     EXPECT_EQ(values[0], -2);
     EXPECT_EQ(values[1], -1);

@@ -99,6 +99,38 @@ TEST_F(uniform, doubles_are_the_rule_rounded_once) {
   compare_ranges<double>();
 }
 
+// Ranges and words whose exact result lies so close to the middle of two floats that a sum rounded
+// to double falls onto the middle: rounding it again to float goes wrong. With the offset next to 1
+// the product has to be 2^-24, half a unit of the offset, up to an error below 2^-53: word * S with
+// S next to 2^k / word, and the scale S * 2^(-24 - k).
+TEST_F(uniform, floats_next_to_a_tie_are_rounded_once) {
+  support::stream s;
+  int cases = 0;
+  for (std::uint32_t word = 33; word < 1024; word += 2) {
+    const int k = 24 + std::ilogb(word);
+    for (const std::int64_t step : {0, 1}) {
+      const auto width = static_cast<float>(
+          std::ldexp(static_cast<double>((std::int64_t{1} << k) / word + step), 8 - k));
+      for (int ulps = -2; ulps <= 2; ++ulps) {
+        const float b = static_cast<float>(1 + width / 2) + static_cast<float>(ulps) * 0x1p-22f;
+        const float a = b - width;
+        const rule<float> expected(a, b);
+        const double product = static_cast<double>(word) * static_cast<double>(expected.scale);
+        const auto twice = static_cast<float>(product + static_cast<double>(expected.offset));
+        if (bits(twice) == bits(expected(word)))
+          continue;
+        ++cases;
+        s.set(key, plain::counter_of({word, 0 - word, word, word}, key), 0);
+        float r[4];
+        ASSERT_EQ(rvxsRngUniform(0, s, 4, r, a, b), 0);
+        ASSERT_EQ(bits(r[0]), bits(expected(word))) << word << " on [" << a << ", " << b << ")";
+        ASSERT_EQ(bits(r[1]), bits(expected(0 - word)));
+      }
+    }
+  }
+  EXPECT_GE(cases, 10);
+}
+
 // Words at the ends of the range, through counters found by the inverse of Philox.
 constexpr plain::four end_words{0x7FFFFFFF, 0x80000000, 0x7FFFFFC0, 0xFFFFFFFF};
 

@@ -5,9 +5,9 @@
 
 #include <gtest/gtest.h>
 
+#include "stream_verbose.hpp"
 #include "tarn_rvx.h"
 #include "tarn_serv.h"
-#include "verbose.hpp"
 
 namespace {
 

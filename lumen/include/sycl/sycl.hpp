@@ -2,19 +2,25 @@
 // The SYCL 2020 interface of lumen: one include for everything.
 #pragma once
 
-#include "detail/config.hpp"
-#if __has_include("detail/vec.hpp")
-#include "detail/vec.hpp"
-#endif
-#if __has_include("detail/builtins.hpp")
-#include "detail/builtins.hpp"
-#endif
-#if __has_include("detail/bit.hpp")
-#include "detail/bit.hpp"
-#endif
-#if __has_include("detail/functional.hpp")
-#include "detail/functional.hpp"
-#endif
-#if __has_include("detail/atomic_ref.hpp")
+#include "detail/accessor.hpp"
 #include "detail/atomic_ref.hpp"
-#endif
+#include "detail/bit.hpp"
+#include "detail/buffer.hpp"
+#include "detail/builtins.hpp"
+#include "detail/config.hpp"
+#include "detail/context.hpp"
+#include "detail/device.hpp"
+#include "detail/event.hpp"
+#include "detail/exception.hpp"
+#include "detail/functional.hpp"
+#include "detail/group_algorithms.hpp"
+#include "detail/handler.hpp"
+#include "detail/local_accessor.hpp"
+#include "detail/multi_ptr.hpp"
+#include "detail/nd_item.hpp"
+#include "detail/property.hpp"
+#include "detail/queue.hpp"
+#include "detail/range.hpp"
+#include "detail/reduction.hpp"
+#include "detail/usm.hpp"
+#include "detail/vec.hpp"

@@ -46,9 +46,6 @@ void signed_words_to_double(const std::uint32_t* words, std::size_t n, affine<do
 // floor(x) of each number, numbers outside the range of the result giving its nearest end.
 void floor_to_int32(const float* x, std::size_t n, bool streaming, std::int32_t* out);
 
-// Copies words, storing around the caches where the alignment allows.
-void copy_streaming(const std::uint32_t* words, std::size_t n, std::uint32_t* out);
-
 // Orders streaming stores before what this thread writes next.
 void flush_streaming();
 

@@ -185,10 +185,6 @@ void floor_to_int32(const float* x, std::size_t n, bool streaming, std::int32_t*
   });
 }
 
-void copy_streaming(const std::uint32_t* words, std::size_t n, std::uint32_t* out) {
-  map_all(hn::ScalableTag<std::uint32_t>(), words, n, true, out, [](auto w) { return w; });
-}
-
 }  // namespace tarn::statistics::HWY_NAMESPACE
 HWY_AFTER_NAMESPACE();
 
@@ -198,7 +194,6 @@ namespace tarn::statistics {
 HWY_EXPORT(signed_words_to_float);
 HWY_EXPORT(signed_words_to_double);
 HWY_EXPORT(floor_to_int32);
-HWY_EXPORT(copy_streaming);
 
 void signed_words_to_float(const std::uint32_t* words, std::size_t n, affine<float> map,
                            const finish<float>& end, float* out) {
@@ -212,10 +207,6 @@ void signed_words_to_double(const std::uint32_t* words, std::size_t n, affine<do
 
 void floor_to_int32(const float* x, std::size_t n, bool streaming, std::int32_t* out) {
   TARN_SIMD_CALL(floor_to_int32)(x, n, streaming, out);
-}
-
-void copy_streaming(const std::uint32_t* words, std::size_t n, std::uint32_t* out) {
-  TARN_SIMD_CALL(copy_streaming)(words, n, out);
 }
 
 void flush_streaming() {

@@ -59,9 +59,17 @@ struct atomic_difference<T*> {
 
 }  // namespace detail
 
+// GCC warns that its thread sanitizer does not see fences; that is no fault of the caller.
+#if defined(__SANITIZE_THREAD__) && !defined(__clang__)
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wtsan"
+#endif
 SYCL_EXTERNAL inline void atomic_fence(memory_order order, memory_scope) {
   __atomic_thread_fence(detail::builtin_order(order));
 }
+#if defined(__SANITIZE_THREAD__) && !defined(__clang__)
+#pragma GCC diagnostic pop
+#endif
 
 // A view of an object of type T through which all access is atomic: an integer of 32 or 64 bits,
 // a float, a double, or a pointer.

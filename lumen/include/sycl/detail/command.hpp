@@ -17,15 +17,14 @@ class interop_handle;
 
 namespace detail {
 
-// Sizes of a launch. A plain range has local_range 0 in dimension 0.
+// Sizes of a launch; local_range matters for groups only.
 struct launch_shape {
   int dimensions = 1;
   std::size_t global_range[3] = {1, 1, 1};
-  std::size_t local_range[3] = {0, 1, 1};
+  std::size_t local_range[3] = {1, 1, 1};
   std::size_t offset[3] = {0, 0, 0};
   std::size_t local_bytes = 0;
 
-  bool has_groups() const { return local_range[0] != 0; }
   std::size_t total() const { return global_range[0] * global_range[1] * global_range[2]; }
 };
 
@@ -72,6 +71,8 @@ class LUMEN_EXPORT kernel_command : public command {
   virtual void run_items(std::size_t begin, std::size_t end) const;
   // Items of one group, from frame.next_item on, until none is left or the group diverged.
   virtual void run_group(group_frame& frame) const;
+  // True for a launch over an nd_range.
+  virtual bool needs_groups() const;
   // Called once after the last item.
   virtual void finish();
 };
@@ -158,6 +159,7 @@ template <int Dimensions, typename Function>
 class nd_range_kernel final : public kernel_command {
  public:
   explicit nd_range_kernel(const Function& function) : function_(function) {}
+  bool needs_groups() const override { return true; }
   void run_group(group_frame& frame) const override {
     while (frame.next_item < frame.item_count) {
       function_(nd_item_maker::make<Dimensions>(frame, frame.next_item++));

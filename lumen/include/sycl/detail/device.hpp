@@ -35,9 +35,15 @@ using enable_if_selector =
                      int>;
 template <typename Selector>
 selector_view view_of(const Selector& selector) {
-  return {std::addressof(selector), [](const void* object, const device& candidate) {
-            return static_cast<int>((*static_cast<const Selector*>(object))(candidate));
-          }};
+  if constexpr (std::is_function_v<Selector>) {
+    return {reinterpret_cast<const void*>(&selector), [](const void* object, const device& d) {
+              return static_cast<int>(reinterpret_cast<const Selector*>(object)(d));
+            }};
+  } else {
+    return {std::addressof(selector), [](const void* object, const device& d) {
+              return static_cast<int>((*static_cast<const Selector*>(object))(d));
+            }};
+  }
 }
 }  // namespace detail
 

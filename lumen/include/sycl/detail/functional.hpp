@@ -3,8 +3,6 @@
 // operands, as those of the C++ standard library do.
 #pragma once
 
-#include <utility>
-
 #include "config.hpp"
 
 LUMEN_NAMESPACE_BEGIN
@@ -26,11 +24,11 @@ LUMEN_NAMESPACE_BEGIN
   };
 
 LUMEN_FUNCTION_OBJECT(plus, x + y)
-LUMEN_FUNCTION_OBJECT(multiplies, x* y)
-LUMEN_FUNCTION_OBJECT(bit_and, x& y)
+LUMEN_FUNCTION_OBJECT(multiplies, (x * y))
+LUMEN_FUNCTION_OBJECT(bit_and, (x & y))
 LUMEN_FUNCTION_OBJECT(bit_or, x | y)
 LUMEN_FUNCTION_OBJECT(bit_xor, x ^ y)
-LUMEN_FUNCTION_OBJECT(logical_and, x&& y)
+LUMEN_FUNCTION_OBJECT(logical_and, (x && y))
 LUMEN_FUNCTION_OBJECT(logical_or, x || y)
 LUMEN_FUNCTION_OBJECT(minimum, y < x ? y : x)
 LUMEN_FUNCTION_OBJECT(maximum, x < y ? y : x)

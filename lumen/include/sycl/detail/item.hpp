@@ -11,7 +11,7 @@ struct item_maker;
 }
 
 template <int Dimensions = 1, bool WithOffset = true>
-class item {
+class item : public detail::number_like<item<Dimensions, WithOffset>, Dimensions> {
  public:
   static constexpr int dimensions = Dimensions;
   item() = delete;
@@ -36,10 +36,6 @@ class item {
   template <bool O = WithOffset, std::enable_if_t<!O, int> = 0>
   SYCL_EXTERNAL operator item<Dimensions, true>() const {
     return item<Dimensions, true>(index_, sizes_, id<Dimensions>());
-  }
-  template <int D = Dimensions, std::enable_if_t<D == 1, int> = 0>
-  SYCL_EXTERNAL operator std::size_t() const {
-    return index_[0];
   }
 
   friend bool operator==(const item& a, const item& b) {

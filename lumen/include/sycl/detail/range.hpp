@@ -115,6 +115,16 @@ class coordinates {
   std::size_t values_[Dimensions] = {};
 };
 
+// One-dimensional indices are numbers too. The operator is no template, so that the built-in
+// operators (pointer[id], id + 1) see it.
+template <typename Derived, int Dimensions>
+class number_like {};
+template <typename Derived>
+class number_like<Derived, 1> {
+ public:
+  SYCL_EXTERNAL operator std::size_t() const { return static_cast<const Derived&>(*this)[0]; }
+};
+
 }  // namespace detail
 
 template <int Dimensions = 1>
@@ -156,7 +166,8 @@ template <int Dimensions, bool WithOffset>
 class item;
 
 template <int Dimensions = 1>
-class id : public detail::coordinates<id, Dimensions> {
+class id : public detail::coordinates<id, Dimensions>,
+           public detail::number_like<id<Dimensions>, Dimensions> {
  public:
   static constexpr int dimensions = Dimensions;
 
@@ -183,11 +194,6 @@ class id : public detail::coordinates<id, Dimensions> {
   }
   template <bool WithOffset>
   SYCL_EXTERNAL id(const item<Dimensions, WithOffset>& source) : id(source.get_id()) {}
-
-  template <int D = Dimensions, std::enable_if_t<D == 1, int> = 0>
-  SYCL_EXTERNAL operator std::size_t() const {
-    return this->values_[0];
-  }
 };
 id(std::size_t)->id<1>;
 id(std::size_t, std::size_t)->id<2>;

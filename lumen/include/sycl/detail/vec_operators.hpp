@@ -101,11 +101,11 @@ struct vec_operators {
   LUMEN_VEC_BINARY(>>, std::is_integral_v<U>)
 #undef LUMEN_VEC_BINARY
 
-#define LUMEN_VEC_COMPARISON(op)                                                          \
+#define LUMEN_VEC_COMPARISON(op, truth)                                                   \
   SYCL_EXTERNAL friend constexpr vec<mask_of<T>, N> operator op(const V& a, const V& b) { \
     vec<mask_of<T>, N> result;                                                            \
     LUMEN_UNROLL for (int i = 0; i < N; ++i) {                                            \
-      result[i] = (a[i] op b[i]) ? mask_of<T>(-1) : mask_of<T>(0);                        \
+      result[i] = (truth) ? mask_of<T>(-1) : mask_of<T>(0);                               \
     }                                                                                     \
     return result;                                                                        \
   }                                                                                       \
@@ -118,14 +118,14 @@ struct vec_operators {
     return V(static_cast<T>(a)) op b;                                                     \
   }
 
-  LUMEN_VEC_COMPARISON(==)
-  LUMEN_VEC_COMPARISON(!=)
-  LUMEN_VEC_COMPARISON(<)
-  LUMEN_VEC_COMPARISON(>)
-  LUMEN_VEC_COMPARISON(<=)
-  LUMEN_VEC_COMPARISON(>=)
-  LUMEN_VEC_COMPARISON(&&)
-  LUMEN_VEC_COMPARISON(||)
+  LUMEN_VEC_COMPARISON(==, a[i] == b[i])
+  LUMEN_VEC_COMPARISON(!=, a[i] != b[i])
+  LUMEN_VEC_COMPARISON(<, a[i] < b[i])
+  LUMEN_VEC_COMPARISON(>, a[i] > b[i])
+  LUMEN_VEC_COMPARISON(<=, a[i] <= b[i])
+  LUMEN_VEC_COMPARISON(>=, a[i] >= b[i])
+  LUMEN_VEC_COMPARISON(&&, (a[i] != T(0)) && (b[i] != T(0)))
+  LUMEN_VEC_COMPARISON(||, (a[i] != T(0)) || (b[i] != T(0)))
 #undef LUMEN_VEC_COMPARISON
 
 #define LUMEN_VEC_UNARY(op, available)                            \

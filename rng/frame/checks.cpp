@@ -3,9 +3,7 @@
 #include <cstddef>
 #include <cstdint>
 
-#include <kestrel/tarn/exceptions.hpp>
-
-#include "frame/generate.hpp"
+#include "frame/checks.hpp"
 
 namespace kestrel::tarn::rng::detail {
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Verbose lines of the stream services.
-#include "verbose.hpp"
+#include "stream_verbose.hpp"
 
 #include <cstdarg>
 #include <cstdio>

@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: Apache-2.0
+// What a command group function leaves behind: the work, its launch sizes and all that the
+// work must come after.
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <vector>
+
+#include "command.hpp"
+#include "event.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+
+namespace detail {
+
+class buffer_core;
+class queue_core;
+
+struct access_request {
+  buffer_core* core;
+  bool writes;
+};
+
+enum class work_kind : char { none, host, kernel };
+
+struct command_group {
+  queue_core* queue = nullptr;
+  work_kind kind = work_kind::none;
+  std::unique_ptr<command> work;
+  launch_shape shape;
+  std::size_t local_bytes = 0;
+  std::vector<task_ref> dependencies;
+  std::vector<access_request> accesses;
+};
+
+}  // namespace detail
+
+LUMEN_NAMESPACE_END

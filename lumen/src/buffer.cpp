@@ -1,0 +1,142 @@
+// SPDX-License-Identifier: Apache-2.0
+// Buffer memory and the order of its users.
+#include "sycl/detail/buffer_core.hpp"
+
+#include <algorithm>
+#include <cstdlib>
+
+#include "access_record.hpp"
+#include "handler_access.hpp"
+#include "sycl/detail/exception.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+namespace detail {
+
+std::mutex& access_record::order_mutex() {
+  static std::mutex& only = *new std::mutex;
+  return only;
+}
+
+void access_record::add(task& user, bool writes) {
+  if (last_writer_) {
+    user.depend_on(*last_writer_.get());
+  }
+  for (const holder& h : holders_) {
+    if (writes || h.writes) {
+      user.depend_on(*h.task.get());
+    }
+  }
+  if (!writes) {
+    readers_.erase(std::remove_if(readers_.begin(), readers_.end(),
+                                  [](const task_ref& reader) { return reader->done(); }),
+                   readers_.end());
+    readers_.push_back(share(user));
+    return;
+  }
+  for (const task_ref& reader : readers_) {
+    user.depend_on(*reader.get());
+  }
+  readers_.clear();
+  last_writer_ = share(user);
+}
+
+void access_record::add_holder(task& user, bool writes) {
+  holders_.push_back({share(user), writes});
+}
+
+void access_record::remove_holder(const task& user) {
+  holders_.erase(std::remove_if(holders_.begin(), holders_.end(),
+                                [&user](const holder& h) { return h.task.get() == &user; }),
+                 holders_.end());
+}
+
+std::vector<task_ref> access_record::conflicts(bool writes) const {
+  std::vector<task_ref> result;
+  if (last_writer_) {
+    result.push_back(last_writer_);
+  }
+  if (writes) {
+    result.insert(result.end(), readers_.begin(), readers_.end());
+  }
+  return result;
+}
+
+buffer_core::buffer_core(std::size_t bytes)
+    : bytes_(bytes), record_(std::make_unique<access_record>()) {}
+buffer_core::~buffer_core() = default;
+
+namespace {
+std::vector<task_ref> conflicts_of(buffer_core& core, bool writes) {
+  const std::lock_guard<std::mutex> lock(access_record::order_mutex());
+  return core.record().conflicts(writes);
+}
+// A task that holds the last copy of a buffer must not wait for itself.
+void wait_for_others(const std::vector<task_ref>& tasks) {
+  for (const task_ref& t : tasks) {
+    if (!t->runs_on_this_thread()) {
+      t->wait();
+    }
+  }
+}
+
+// One host accessor: stands in the buffer's record as a task that is done when this goes.
+class host_hold {
+ public:
+  host_hold(std::shared_ptr<buffer_core> core, bool writes)
+      : core_(std::move(core)), task_(new task(nullptr, command_group{})) {
+    std::vector<task_ref> before;
+    {
+      const std::lock_guard<std::mutex> lock(access_record::order_mutex());
+      before = core_->record().conflicts(writes);
+      core_->record().add_holder(*task_, writes);
+    }
+    wait_for_others(before);
+  }
+  host_hold(const host_hold&) = delete;
+  host_hold& operator=(const host_hold&) = delete;
+  ~host_hold() {
+    const task_ref mine = share(*task_);
+    {
+      const std::lock_guard<std::mutex> lock(access_record::order_mutex());
+      core_->record().remove_holder(*task_);
+    }
+    task_->finish_linking();
+    task_->wait();
+  }
+
+ private:
+  std::shared_ptr<buffer_core> core_;
+  task* task_;  // keeps itself alive until it is done
+};
+}  // namespace
+
+buffer_handle::buffer_handle(std::shared_ptr<buffer_core> shared_core)
+    : core(std::move(shared_core)) {}
+
+buffer_handle::~buffer_handle() {
+  wait_for_others(conflicts_of(*core, true));
+  core->write_back();
+}
+
+void require_access(handler& group, buffer_core& core, bool writes) {
+  handler_access::group(group).accesses.push_back({&core, writes});
+}
+
+std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core, bool writes) {
+  return std::make_shared<host_hold>(core, writes);
+}
+
+void* allocate_buffer(std::size_t bytes) {
+  constexpr std::size_t line = 64;
+  void* data = bytes > static_cast<std::size_t>(-1) - line
+                   ? nullptr
+                   : std::aligned_alloc(line, (bytes + line - 1) / line * line);
+  if (data == nullptr) {
+    throw exception(make_error_code(errc::memory_allocation), "a buffer does not fit in memory");
+  }
+  return data;
+}
+void free_buffer(void* data) noexcept { std::free(data); }
+
+}  // namespace detail
+LUMEN_NAMESPACE_END

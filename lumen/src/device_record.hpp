@@ -1,0 +1,47 @@
+// SPDX-License-Identifier: Apache-2.0
+// The records behind devices and platforms. They are made once, at the first enumeration, and
+// live as long as the process, so handles to them are plain pointers.
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "sycl/detail/device.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+namespace detail {
+
+class backend_driver;
+
+// One answer for each row of the list of device queries.
+struct device_properties {
+#define LUMEN_DEVICE_INFO(name, type) type name{};
+#include "sycl/detail/info_device.def"
+#undef LUMEN_DEVICE_INFO
+};
+
+struct platform_record {
+  sycl::backend kind = sycl::backend::host;
+  std::string name;
+  std::string vendor;
+  std::string version;
+  std::string profile;
+  std::vector<std::string> extensions;
+};
+
+struct device_record {
+  device_properties properties;
+  backend_driver* driver = nullptr;
+  const platform_record* platform = nullptr;
+  // What the default selector rates the device; real GPUs of later backends go above the host.
+  int default_rating = 0;
+
+  static const device_record& of(const device& dev) { return *dev.record_; }
+  static device handle(const device_record& record) { return device(&record); }
+};
+
+// All devices of all backends, in the order of their enumeration.
+const std::vector<const device_record*>& all_devices();
+
+}  // namespace detail
+LUMEN_NAMESPACE_END

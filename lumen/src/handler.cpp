@@ -1,0 +1,203 @@
+// SPDX-License-Identifier: Apache-2.0
+// Command groups: checks of launches, memory commands, and the step from group to task.
+#include "sycl/detail/handler.hpp"
+
+#include <climits>
+#include <cstring>
+#include <string>
+
+#include "access_record.hpp"
+#include "backend.hpp"
+#include "event_access.hpp"
+#include "handler_access.hpp"
+#include "queue_core.hpp"
+#include "sycl/detail/reduction.hpp"
+#include "task.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+
+namespace {
+
+constexpr std::size_t id_limit = INT_MAX;
+
+// Kernels may compute ids in 32-bit integers.
+void check_id_limit(const detail::launch_shape& shape) {
+  std::size_t product = 1;
+  bool fits = true;
+  bool empty = false;
+  for (int d = 0; d < shape.dimensions; ++d) {
+    const std::size_t size = shape.global_range[d];
+    empty = empty || size == 0;
+    fits = fits && size <= id_limit && shape.offset[d] <= id_limit &&
+           size + shape.offset[d] <= id_limit;
+    fits = fits && (size == 0 || product <= id_limit / size);
+    product *= size == 0 ? 1 : size;
+  }
+  if (!fits && !(empty && shape.total() == 0 && shape.offset[0] <= id_limit &&
+                 shape.offset[1] <= id_limit && shape.offset[2] <= id_limit)) {
+    throw exception(make_error_code(errc::runtime),
+                    "Provided range is out of integer limits. Pass "
+                    "`-fno-sycl-id-queries-fit-in-int' to disable range check.");
+  }
+}
+
+void check_groups(const detail::launch_shape& shape, std::size_t largest_group) {
+  const auto refuse = [](const std::string& text) {
+    throw exception(make_error_code(errc::nd_range), text);
+  };
+  std::size_t items = 1;
+  for (int d = 0; d < shape.dimensions; ++d) {
+    const std::size_t local = shape.local_range[d];
+    const std::string where = " in dimension " + std::to_string(d);
+    if (local == 0) {
+      refuse("the local range is zero" + where);
+    }
+    if (shape.global_range[d] % local != 0) {
+      refuse("the global range " + std::to_string(shape.global_range[d]) +
+             " is not a multiple of the local range " + std::to_string(local) + where);
+    }
+    if (local > largest_group / items) {
+      refuse("the work-group has more items than the device's max_work_group_size, " +
+             std::to_string(largest_group));
+    }
+    items *= local;
+  }
+}
+
+// A host command inside the library: calls a function object that is given the backend.
+template <typename Function>
+class memory_command final : public detail::host_command {
+ public:
+  explicit memory_command(Function function) : function_(std::move(function)) {}
+  void run(const interop_handle&) override { function_(); }
+
+ private:
+  Function function_;
+};
+template <typename Function>
+std::unique_ptr<detail::host_command> memory_work(Function function) {
+  return std::make_unique<memory_command<Function>>(std::move(function));
+}
+
+void check_pointer(const void* pointer, std::size_t bytes, const char* text) {
+  if (pointer == nullptr && bytes != 0) {
+    detail::throw_invalid(text);
+  }
+}
+
+}  // namespace
+
+handler::handler(detail::queue_core& core) { group_.queue = &core; }
+handler::~handler() = default;
+
+void handler::depends_on(const event& dependency) {
+  if (const detail::task_ref& task = detail::event_access::task_of(dependency)) {
+    group_.dependencies.push_back(task);
+  }
+}
+void handler::depends_on(const std::vector<event>& dependencies) {
+  for (const event& dependency : dependencies) {
+    depends_on(dependency);
+  }
+}
+
+void handler::launch(const detail::launch_shape& shape,
+                     std::unique_ptr<detail::kernel_command> work) {
+  const detail::device_properties& limits = group_.queue->record.properties;
+  check_id_limit(shape);
+  if (work->needs_groups()) {
+    check_groups(shape, limits.max_work_group_size);
+  }
+  if (group_.local_bytes > limits.local_mem_size) {
+    throw exception(make_error_code(errc::memory_allocation),
+                    "the local accessors need " + std::to_string(group_.local_bytes) +
+                        " bytes; the device has " + std::to_string(limits.local_mem_size));
+  }
+  if (group_.kind != detail::work_kind::none) {
+    detail::throw_invalid("a command group has more than one command");
+  }
+  group_.kind = detail::work_kind::kernel;
+  group_.shape = shape;
+  group_.shape.local_bytes = group_.local_bytes;
+  group_.work = std::move(work);
+}
+
+void handler::run_on_host(std::unique_ptr<detail::host_command> work) {
+  if (group_.kind != detail::work_kind::none) {
+    detail::throw_invalid("a command group has more than one command");
+  }
+  group_.kind = detail::work_kind::host;
+  group_.work = std::move(work);
+}
+
+void handler::memcpy(void* to, const void* from, std::size_t bytes) {
+  check_pointer(to, bytes, "memcpy: the destination is null");
+  check_pointer(from, bytes, "memcpy: the source is null");
+  const detail::device_record& device = group_.queue->record;
+  run_on_host(
+      memory_work([&device, to, from, bytes] { device.driver->copy(device, to, from, bytes); }));
+}
+void handler::memset(void* pointer, int value, std::size_t bytes) {
+  const auto pattern = static_cast<unsigned char>(value);
+  fill_bytes(pointer, &pattern, 1, bytes);
+}
+void handler::fill_bytes(void* pointer, const void* pattern, std::size_t pattern_bytes,
+                         std::size_t count) {
+  check_pointer(pointer, count, "fill: the destination is null");
+  const detail::device_record& device = group_.queue->record;
+  const auto* first = static_cast<const unsigned char*>(pattern);
+  std::vector<unsigned char> kept(first, first + pattern_bytes);
+  run_on_host(memory_work([&device, pointer, kept = std::move(kept), count] {
+    device.driver->fill(device, pointer, kept.data(), kept.size(), count);
+  }));
+}
+void handler::prefetch(void* pointer, std::size_t bytes) {
+  const detail::device_record& device = group_.queue->record;
+  run_on_host(
+      memory_work([&device, pointer, bytes] { device.driver->prefetch(device, pointer, bytes); }));
+}
+void handler::mem_advise(void* pointer, std::size_t bytes, int advice) {
+  const detail::device_record& device = group_.queue->record;
+  run_on_host(memory_work([&device, pointer, bytes, advice] {
+    device.driver->advise(device, pointer, bytes, advice);
+  }));
+}
+
+event handler::finish() {
+  detail::queue_core& core = *group_.queue;
+  const std::vector<detail::task_ref> dependencies = std::move(group_.dependencies);
+  const std::vector<detail::access_request> accesses = std::move(group_.accesses);
+  auto* task = new detail::task(core.shared_from_this(), std::move(group_));
+  event result = detail::event_access::make(detail::share(*task));
+  for (const detail::task_ref& dependency : dependencies) {
+    task->depend_on(*dependency.get());
+  }
+  if (accesses.empty()) {
+    core.add(*task);
+  } else {
+    const std::lock_guard<std::mutex> lock(detail::access_record::order_mutex());
+    for (const detail::access_request& access : accesses) {
+      access.core->record().add(*task, access.writes);
+    }
+    core.add(*task);
+  }
+  task->finish_linking();
+  return result;
+}
+
+namespace detail {
+
+void reduction_launcher::launch(handler& group, const launch_shape& shape,
+                                std::unique_ptr<kernel_command> work) {
+  handler_access::launch(group, shape, std::move(work));
+}
+
+std::size_t reserve_local(handler& group, std::size_t bytes, std::size_t alignment) {
+  std::size_t& used = handler_access::group(group).local_bytes;
+  const std::size_t place = (used + alignment - 1) / alignment * alignment;
+  used = place + bytes;
+  return place;
+}
+}  // namespace detail
+
+LUMEN_NAMESPACE_END

@@ -1,0 +1,120 @@
+// SPDX-License-Identifier: Apache-2.0
+// The backend of the host CPU and of the virtual devices, which share its memory and threads.
+#include <cstdlib>
+#include <cstring>
+#include <exception>
+#include <mutex>
+
+#include "../backend.hpp"
+#include "../executor.hpp"
+#include "group_runner.hpp"
+#include "host_devices.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+namespace detail {
+
+namespace {
+
+// A kernel under way: the first error stops the chunks that have not begun.
+struct launch_state {
+  const kernel_command& kernel;
+  const launch_shape& shape;
+  shared_loop* loop;
+  std::mutex mutex;
+  std::exception_ptr error;
+
+  void fail() {
+    const std::lock_guard<std::mutex> lock(mutex);
+    if (!error) {
+      error = std::current_exception();
+    }
+    loop->next.store(loop->total, std::memory_order_relaxed);
+  }
+};
+
+void run_items(void* context, std::size_t begin, std::size_t end) {
+  auto& state = *static_cast<launch_state*>(context);
+  try {
+    state.kernel.run_items(begin, end);
+  } catch (...) {
+    state.fail();
+  }
+}
+
+void run_groups(void* context, std::size_t begin, std::size_t end) {
+  auto& state = *static_cast<launch_state*>(context);
+  try {
+    group_runner::of_this_thread().run(state.kernel, state.shape, begin, end);
+  } catch (...) {
+    state.fail();
+  }
+}
+
+class host_driver final : public backend_driver {
+ public:
+  std::vector<std::unique_ptr<device_record>> enumerate() override { return host_devices(); }
+
+  void* allocate(const device_record&, usm::alloc, std::size_t alignment,
+                 std::size_t bytes) override {
+    void* pointer = nullptr;
+    return posix_memalign(&pointer, alignment, bytes) == 0 ? pointer : nullptr;
+  }
+  void release(const device_record&, usm::alloc, void* pointer) noexcept override {
+    std::free(pointer);
+  }
+
+  void copy(const device_record&, void* to, const void* from, std::size_t bytes) override {
+    if (bytes != 0) {
+      std::memmove(to, from, bytes);
+    }
+  }
+  void fill(const device_record&, void* to, const void* pattern, std::size_t pattern_bytes,
+            std::size_t count) override {
+    if (count == 0) {
+      return;
+    }
+    if (pattern_bytes == 1) {
+      std::memset(to, *static_cast<const unsigned char*>(pattern), count);
+      return;
+    }
+    // The filled part doubles with every copy.
+    const std::size_t bytes = pattern_bytes * count;
+    auto* first = static_cast<char*>(to);
+    std::memcpy(first, pattern, pattern_bytes);
+    for (std::size_t done = pattern_bytes; done < bytes; done *= 2) {
+      std::memcpy(first + done, first, done < bytes - done ? done : bytes - done);
+    }
+  }
+  // All memory is the host's own: there is nothing to move or to advise.
+  void prefetch(const device_record&, void*, std::size_t) override {}
+  void advise(const device_record&, void*, std::size_t, int) override {}
+
+  void launch(const device_record&, const launch_shape& shape, kernel_command& kernel) override {
+    if (shape.total() == 0) {
+      return;
+    }
+    executor& threads = executor::instance();
+    std::size_t units = shape.total();
+    const bool groups = kernel.needs_groups();
+    if (groups) {
+      units /= shape.local_range[0] * shape.local_range[1] * shape.local_range[2];
+    }
+    // Enough chunks to balance uneven ones, few enough that taking one costs nothing.
+    const std::size_t grain = units / (threads.thread_count() * std::size_t{16}) + 1;
+    launch_state state{kernel, shape, nullptr, {}, nullptr};
+    shared_loop loop(groups ? &run_groups : &run_items, &state, units, grain);
+    state.loop = &loop;
+    threads.run(loop);
+    if (state.error) {
+      std::rethrow_exception(state.error);
+    }
+  }
+  void synchronise(const device_record&) override {}
+};
+
+}  // namespace
+
+std::unique_ptr<backend_driver> make_host_driver() { return std::make_unique<host_driver>(); }
+
+}  // namespace detail
+LUMEN_NAMESPACE_END

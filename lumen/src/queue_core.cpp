@@ -1,0 +1,114 @@
+// SPDX-License-Identifier: Apache-2.0
+// The queue's list of unfinished tasks and its way of telling asynchronous errors.
+#include "queue_core.hpp"
+
+#include <cstdio>
+
+#include "clock.hpp"
+#include "device_record.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+namespace detail {
+
+namespace {
+// What the standard asks of a program without a handler: a word on the error stream, the end.
+[[noreturn]] void default_handler(const exception_list& errors) {
+  for (const std::exception_ptr& error : errors) {
+    try {
+      std::rethrow_exception(error);
+    } catch (const std::exception& known) {
+      std::fprintf(stderr, "lumen: unhandled asynchronous error: %s\n", known.what());
+    } catch (...) {
+      std::fprintf(stderr, "lumen: unhandled asynchronous error of unknown type\n");
+    }
+  }
+  std::terminate();
+}
+}  // namespace
+
+queue_core::queue_core(const context& owner, const device& where, const async_handler& handler,
+                       const property_list& wanted)
+    : ctx(owner),
+      dev(where),
+      record(device_record::of(where)),
+      properties(wanted),
+      in_order(wanted.has<property::queue::in_order>()),
+      profiling(wanted.has<property::queue::enable_profiling>()),
+      handler_(handler ? handler : context_state::of(owner).handler) {}
+
+void queue_core::add(task& added) {
+  if (profiling) {
+    added.submit_time.store(now_nanoseconds(), std::memory_order_relaxed);
+  }
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (in_order && last_ != nullptr) {
+    added.depend_on(*last_);
+  }
+  added.queue_previous = last_;
+  (last_ != nullptr ? last_->queue_next : first_) = &added;
+  last_ = &added;
+}
+
+void queue_core::remove(task& finished) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  (finished.queue_previous != nullptr ? finished.queue_previous->queue_next : first_) =
+      finished.queue_next;
+  (finished.queue_next != nullptr ? finished.queue_next->queue_previous : last_) =
+      finished.queue_previous;
+}
+
+void queue_core::wait() {
+  std::vector<task_ref> unfinished;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    for (task* t = first_; t != nullptr; t = t->queue_next) {
+      unfinished.push_back(share(*t));
+    }
+  }
+  for (const task_ref& t : unfinished) {
+    if (!t->runs_on_this_thread()) {
+      t->wait();
+    }
+  }
+}
+
+void queue_core::report(std::exception_ptr error) {
+  std::vector<std::exception_ptr> late;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    (abandoned_ ? late : errors_).push_back(std::move(error));
+  }
+  call_handler(std::move(late));
+}
+
+void queue_core::throw_asynchronous() {
+  std::vector<std::exception_ptr> errors;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    errors.swap(errors_);
+  }
+  call_handler(std::move(errors));
+}
+
+void queue_core::abandon() {
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    abandoned_ = true;
+  }
+  throw_asynchronous();
+}
+
+void queue_core::call_handler(std::vector<std::exception_ptr> errors) {
+  if (errors.empty()) {
+    return;
+  }
+  exception_list list;
+  list.list_ = std::move(errors);
+  if (!handler_) {
+    default_handler(list);
+  }
+  handler_(std::move(list));
+}
+
+}  // namespace detail
+LUMEN_NAMESPACE_END

@@ -1,0 +1,38 @@
+// SPDX-License-Identifier: Apache-2.0
+// The environment variables of lumen, read once each. A malformed value is reported on the error
+// stream with its place and then counts as not given.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "sycl/detail/config.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+namespace detail {
+
+// LUMEN_NUM_THREADS: 1 to 4096, otherwise the number of hardware threads.
+unsigned number_of_threads();
+
+// One device of LUMEN_VIRTUAL_DEVICES.
+struct virtual_device_setting {
+  bool is_gpu = true;
+  std::uint32_t compute_units = 0;      // 0: as the host
+  std::size_t max_work_group_size = 0;  // 0: as the host
+};
+
+struct virtual_device_parse {
+  std::vector<virtual_device_setting> devices;
+  std::string error;       // empty when the text is well formed
+  std::size_t column = 0;  // of the error, from 1
+};
+
+// kind[,setting=number]... joined by ';'. Kinds: gpu, accelerator. Settings: compute_units
+// (1 to 65536), max_work_group_size (1 to 4096).
+virtual_device_parse parse_virtual_devices(const std::string& text);
+std::vector<virtual_device_setting> virtual_devices_from_environment();
+
+}  // namespace detail
+LUMEN_NAMESPACE_END

@@ -1,0 +1,98 @@
+// SPDX-License-Identifier: Apache-2.0
+// A submitted command group: its work, what it waits for and what waits for it. A task is
+// pending until its dependencies are done, ready until a thread claims it, running, then done.
+#pragma once
+
+#include <atomic>
+#include <cstdint>
+#include <exception>
+#include <memory>
+#include <mutex>
+#include <vector>
+
+#include "sycl/detail/command_group.hpp"
+
+LUMEN_NAMESPACE_BEGIN
+namespace detail {
+
+class executor;
+
+enum class task_state : std::uint32_t { pending, ready, running, done };
+
+class task {
+ public:
+  // Without a queue the task stands for something that holds others up, such as a host accessor.
+  task(std::shared_ptr<queue_core> queue, command_group&& group);
+  task(const task&) = delete;
+  task& operator=(const task&) = delete;
+  ~task();
+
+  void retain() noexcept { references_.fetch_add(1, std::memory_order_relaxed); }
+  void release() noexcept {
+    if (references_.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+      delete this;
+    }
+  }
+
+  // Until finish_linking dependencies may be added; from then on the task may run.
+  void depend_on(task& other);
+  void finish_linking();
+
+  task_state state() const noexcept {
+    return static_cast<task_state>(word_.load(std::memory_order_acquire) & state_mask);
+  }
+  bool done() const noexcept { return state() == task_state::done; }
+  // Blocks until done, running the task or what it depends on where nobody else does.
+  void wait();
+  // Runs a claimed task to its end on the calling thread.
+  void run();
+  // True while the calling thread is inside run() of this task.
+  bool runs_on_this_thread() const noexcept;
+
+  std::vector<task_ref> dependencies();
+  const std::shared_ptr<queue_core>& queue() const noexcept { return queue_; }
+
+  // Nanoseconds; 0 where the queue does not profile.
+  std::atomic<std::uint64_t> submit_time{0};
+  std::atomic<std::uint64_t> start_time{0};
+  std::atomic<std::uint64_t> end_time{0};
+
+  // Links of the executor's ready list, guarded by the executor.
+  task* ready_next = nullptr;
+  task* ready_previous = nullptr;
+  std::uint64_t ticket = 0;
+  // Links of the queue's list of unfinished tasks, guarded by the queue.
+  task* queue_next = nullptr;
+  task* queue_previous = nullptr;
+
+ private:
+  friend class executor;
+  static constexpr std::uint32_t state_mask = 3;
+  static constexpr std::uint32_t waited_bit = 4;
+
+  void execute();
+  void dependency_done();
+  void set_state(task_state next) noexcept;
+  task_ref ready_ancestor();
+
+  std::atomic<std::uint32_t> references_{1};
+  // The state in the low bits, plus whether somebody sleeps on this word.
+  std::atomic<std::uint32_t> word_{0};
+  // Unfinished dependencies, plus one while linking.
+  std::atomic<std::uint32_t> unmet_{1};
+  std::shared_ptr<queue_core> queue_;
+  work_kind kind_;
+  launch_shape shape_;
+  std::unique_ptr<command> work_;
+  std::mutex mutex_;  // guards the two lists and the step to done
+  std::vector<task_ref> dependencies_;
+  std::vector<task_ref> successors_;
+};
+
+inline task_ref share(task& t) noexcept {
+  t.retain();
+  return task_ref(&t);
+}
+
+}  // namespace detail
+LUMEN_NAMESPACE_END
