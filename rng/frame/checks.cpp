@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // The checks of a call's count and output, once for all combinations.
+#include "frame/checks.hpp"
+
 #include <cstddef>
 #include <cstdint>
-
-#include "frame/checks.hpp"
 
 namespace kestrel::tarn::rng::detail {
 

@@ -7,9 +7,8 @@
 #include <cstdint>
 #include <string>
 
-#include <sycl/sycl.hpp>
-
 #include <kestrel/tarn/exceptions.hpp>
+#include <sycl/sycl.hpp>
 
 #include "frame/rows.hpp"
 

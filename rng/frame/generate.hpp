@@ -4,10 +4,6 @@
 #pragma once
 
 #include <cstdint>
-#include <memory>
-#include <string>
-#include <type_traits>
-#include <typeinfo>
 #include <vector>
 
 #include <kestrel/tarn/exceptions.hpp>
@@ -23,9 +19,10 @@
 
 namespace kestrel::tarn::rng::detail {
 
-/// `Out` is T* or sycl::buffer<T, 1>&.
+/// The backend frame. `Out` is T* or sycl::buffer<T, 1>&. Out of line, as an entry calls it in two
+/// places and there are thousands of entries.
 template <typename Distr, typename Engine, typename Out>
-sycl::event generate_on_device(const Distr& distr, Engine& engine, std::int64_t n, Out r,
+[[gnu::noinline]] sycl::event generate_on_device(const Distr& distr, Engine& engine, std::int64_t n, Out r,
                                const std::vector<sycl::event>& dependencies) {
   if constexpr (is_refused<Distr, Engine>) {
     refuse_uniform_bits<Engine>();
@@ -61,30 +58,28 @@ namespace kestrel::tarn::rng {
 template <typename Distr, typename Engine>
 sycl::event generate(const Distr& distr, Engine& engine, std::int64_t n,
                      typename Distr::result_type* r, const std::vector<sycl::event>& dependencies) {
-  using T = typename Distr::result_type;
+  const auto frame = [&] {
+    return detail::generate_on_device<Distr, Engine, typename Distr::result_type*>(distr, engine, n,
+                                                                                   r, dependencies);
+  };
   if (!detail::is_verbose()) {
-    return detail::generate_on_device<Distr, Engine, T*>(distr, engine, n, r, dependencies);
+    return frame();
   }
-  detail::verbose_call call(typeid(Distr), typeid(Engine), n, r, engine.get_queue());
-  call.start(dependencies);
-  sycl::event event =
-      detail::generate_on_device<Distr, Engine, T*>(distr, engine, n, r, dependencies);
-  call.finish(event);
-  return event;
+  return detail::run_reported(detail::describe_call<Distr>(engine, n, frame), r, dependencies);
 }
 
 template <typename Distr, typename Engine>
 void generate(const Distr& distr, Engine& engine, std::int64_t n,
               sycl::buffer<typename Distr::result_type, 1>& r) {
-  using T = typename Distr::result_type;
-  using buffer = sycl::buffer<T, 1>&;
+  const auto frame = [&] {
+    return detail::generate_on_device<Distr, Engine, sycl::buffer<typename Distr::result_type, 1>&>(
+        distr, engine, n, r, {});
+  };
   if (!detail::is_verbose()) {
-    detail::generate_on_device<Distr, Engine, buffer>(distr, engine, n, r, {});
+    frame();
     return;
   }
-  detail::verbose_call call(typeid(Distr), typeid(Engine), n, engine.get_queue());
-  call.start(r);
-  call.finish(detail::generate_on_device<Distr, Engine, buffer>(distr, engine, n, r, {}), r);
+  detail::run_reported(detail::describe_call<Distr>(engine, n, frame), r);
 }
 
 }  // namespace kestrel::tarn::rng

@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-// Descriptions of reported calls and the steps around them.
+// The steps around a reported call, and its description.
 #include "frame/verbose_call.hpp"
 
 #include <cstdlib>
 #include <cxxabi.h>
 #include <memory>
 #include <sstream>
+#include <string>
 #include <tarn_serv.h>
 
 #include "verbose.hpp"
@@ -14,6 +15,7 @@ namespace kestrel::tarn::rng::detail {
 namespace {
 
 constexpr int unbound = -1;
+constexpr int timed_level = 2;
 
 /// The class name with its template arguments, as a person writes it.
 std::string readable(const std::type_info& type) {
@@ -23,19 +25,35 @@ std::string readable(const std::type_info& type) {
   return status == 0 ? name.get() : type.name();
 }
 
-std::string describe(const char* form, const std::type_info& distribution,
-                     const std::type_info& engine, std::int64_t n) {
+std::ostringstream description_of(const char* form, const reported_call& call) {
   std::ostringstream text;
   text << "kestrel::tarn::rng::generate " << form
-       << " call with parameters distribution = " << readable(distribution)
-       << ", engine = " << readable(engine) << ", n = " << n;
-  return text.str();
+       << " call with parameters distribution = " << readable(call.distribution)
+       << ", engine = " << readable(call.engine) << ", n = " << call.n;
+  return text;
 }
 
-std::string with_pointer(std::string description, const void* r) {
-  std::ostringstream text;
-  text << description << ", r = " << r;
-  return text.str();
+/// Leaves one level of nesting when an exception passes.
+class nesting_guard {
+ public:
+  nesting_guard() = default;
+  nesting_guard(const nesting_guard&) = delete;
+  nesting_guard& operator=(const nesting_guard&) = delete;
+  ~nesting_guard() {
+    if (armed_) {
+      gpu::verbose_depth_dec();
+    }
+  }
+  void disarm() { armed_ = false; }
+
+ private:
+  bool armed_ = true;
+};
+
+void report(sycl::queue queue, const std::string& description, const sycl::event& event,
+            double seconds) {
+  gpu::verbose_register_event(event);
+  gpu::print_verbose_gpu_info(&queue, description.c_str(), seconds);
 }
 
 }  // namespace
@@ -48,78 +66,58 @@ bool is_verbose_slow() {
   return *level != 0;
 }
 
-verbose_call::verbose_call(const std::type_info& distribution, const std::type_info& engine,
-                           std::int64_t n, const void* r, const sycl::queue& queue)
-    : description_(with_pointer(describe("USM", distribution, engine, n), r)),
-      queue_(queue),
-      timed_(*tarn_serv_verbose_mode() == 2) {}
-
-verbose_call::verbose_call(const std::type_info& distribution, const std::type_info& engine,
-                           std::int64_t n, const sycl::queue& queue)
-    : description_(describe("Buffer", distribution, engine, n)),
-      queue_(queue),
-      timed_(*tarn_serv_verbose_mode() == 2) {}
-
-verbose_call::~verbose_call() {
-  if (entered_) {
-    gpu::verbose_depth_dec();
-  }
-}
-
-void verbose_call::start(const std::vector<sycl::event>& dependencies) {
-  if (timed_) {
+sycl::event run_reported(const reported_call& call, const void* r,
+                         const std::vector<sycl::event>& dependencies) {
+  std::ostringstream description = description_of("USM", call);
+  description << ", r = " << r;
+  const bool timed = *tarn_serv_verbose_mode() == timed_level;
+  double seconds = 0.0;
+  if (timed) {
     for (sycl::event dependency : dependencies) {
       dependency.wait();
     }
-    seconds_ = -tarn_serv_dsecnd();
+    seconds = -tarn_serv_dsecnd();
   }
   gpu::verbose_depth_inc();
-  entered_ = true;
-}
-
-void verbose_call::finish(const sycl::event& event) {
-  if (timed_) {
-    sycl::event(event).wait();
-    seconds_ += tarn_serv_dsecnd();
+  nesting_guard guard;
+  sycl::event event = call.run(call.frame);
+  if (timed) {
+    event.wait();
+    seconds += tarn_serv_dsecnd();
   }
+  guard.disarm();
   gpu::verbose_depth_dec();
-  entered_ = false;
-  report(event);
+  report(call.queue, description.str(), event, seconds);
+  return event;
 }
 
 template <typename T>
-void verbose_call::start(sycl::buffer<T, 1>& r) {
-  if (timed_) {
-    gpu::verbose_buffer_start(&seconds_, r);
+void run_reported(const reported_call& call, sycl::buffer<T, 1>& r) {
+  const std::string description = description_of("Buffer", call).str();
+  const bool timed = *tarn_serv_verbose_mode() == timed_level;
+  double seconds = 0.0;
+  if (timed) {
+    gpu::verbose_buffer_start(&seconds, r);
   } else {
     gpu::verbose_depth_inc();
   }
-  entered_ = true;
-}
-
-template <typename T>
-void verbose_call::finish(const sycl::event& event, sycl::buffer<T, 1>& r) {
-  if (timed_) {
-    gpu::verbose_buffer_end(&seconds_, r);
+  nesting_guard guard;
+  const sycl::event event = call.run(call.frame);
+  if (timed) {
+    gpu::verbose_buffer_end(&seconds, r);
   } else {
     gpu::verbose_depth_dec();
   }
-  entered_ = false;
-  report(event);
+  guard.disarm();
+  report(call.queue, description, event, seconds);
 }
 
-void verbose_call::report(const sycl::event& event) {
-  gpu::verbose_register_event(event);
-  gpu::print_verbose_gpu_info(&queue_, description_.c_str(), seconds_);
-}
-
-#define TARN_VERBOSE_CALL(type)                              \
-  template void verbose_call::start(sycl::buffer<type, 1>&); \
-  template void verbose_call::finish(const sycl::event&, sycl::buffer<type, 1>&);
-TARN_VERBOSE_CALL(float)
-TARN_VERBOSE_CALL(double)
-TARN_VERBOSE_CALL(std::int32_t)
-TARN_VERBOSE_CALL(std::uint32_t)
-TARN_VERBOSE_CALL(std::uint64_t)
+#define TARN_RUN_REPORTED(type) \
+  template void run_reported(const reported_call&, sycl::buffer<type, 1>&);
+TARN_RUN_REPORTED(float)
+TARN_RUN_REPORTED(double)
+TARN_RUN_REPORTED(std::int32_t)
+TARN_RUN_REPORTED(std::uint32_t)
+TARN_RUN_REPORTED(std::uint64_t)
 
 }  // namespace kestrel::tarn::rng::detail

@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-// One reported generate call: its description, its clock, its depth. At level 0 nothing of this
-// runs; asking costs one pointer load and one compare.
+// Reported generate calls. At level 0 nothing of this runs; asking costs one pointer load and one
+// compare.
 #pragma once
 
 #include <atomic>
 #include <cstdint>
-#include <string>
 #include <typeinfo>
 #include <vector>
 
@@ -25,38 +24,33 @@ inline bool is_verbose() {
   return *verbose_level.load(std::memory_order_relaxed) != 0 && is_verbose_slow();
 }
 
-/// Lives around the backend frame. Should that frame raise, the depth goes back and nothing is
-/// printed.
-class verbose_call {
- public:
-  /// For a call into memory.
-  verbose_call(const std::type_info& distribution, const std::type_info& engine, std::int64_t n,
-               const void* r, const sycl::queue& queue);
-  /// For a call into a buffer.
-  verbose_call(const std::type_info& distribution, const std::type_info& engine, std::int64_t n,
-               const sycl::queue& queue);
-  verbose_call(const verbose_call&) = delete;
-  verbose_call& operator=(const verbose_call&) = delete;
-  ~verbose_call();
-
-  /// Waits for what the call depends on (level 2 only), starts the clock, enters the call.
-  void start(const std::vector<sycl::event>& dependencies);
-  template <typename T>
-  void start(sycl::buffer<T, 1>& r);
-
-  /// Waits for the call (level 2 only), stops the clock, leaves the call and reports.
-  void finish(const sycl::event& event);
-  template <typename T>
-  void finish(const sycl::event& event, sycl::buffer<T, 1>& r);
-
- private:
-  void report(const sycl::event& event);
-
-  std::string description_;
-  sycl::queue queue_;
-  bool timed_;
-  bool entered_ = false;
-  double seconds_ = 0.0;
+/// A call without its types: what the report names, and the backend frame behind it.
+struct reported_call {
+  const std::type_info& distribution;
+  const std::type_info& engine;
+  std::int64_t n;
+  sycl::queue& queue;
+  sycl::event (*run)(const void* frame);
+  const void* frame;
 };
+
+template <typename Distr, typename Engine, typename Frame>
+reported_call describe_call(Engine& engine, std::int64_t n, const Frame& frame) {
+  return {typeid(Distr),
+          typeid(Engine),
+          n,
+          engine.get_queue(),
+          [](const void* object) { return (*static_cast<const Frame*>(object))(); },
+          &frame};
+}
+
+/// Runs the call and reports it. At level 2 it waits for `dependencies` before and for the call
+/// after. Should the frame raise, the nesting depth goes back and nothing is printed.
+sycl::event run_reported(const reported_call& call, const void* r,
+                         const std::vector<sycl::event>& dependencies);
+
+/// The same for a call into a buffer: at level 2 work on the buffer is waited for.
+template <typename T>
+void run_reported(const reported_call& call, sycl::buffer<T, 1>& r);
 
 }  // namespace kestrel::tarn::rng::detail

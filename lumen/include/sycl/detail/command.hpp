@@ -105,7 +105,10 @@ class single_kernel final : public kernel_command {
   Function function_;
 };
 
-// Calls the kernel with the item, as an integer where it takes one.
+// Calls the kernel with the item, which becomes an integer where the kernel takes one. A kernel
+// may take a narrower integer than size_t: the range check makes sure that the ids fit.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wconversion"
 template <typename Function, int Dimensions, typename... Rest>
 SYCL_EXTERNAL inline void call_with_item(const Function& function,
                                          const item<Dimensions, true>& position, Rest&... rest) {
@@ -117,6 +120,7 @@ SYCL_EXTERNAL inline void call_with_item(const Function& function,
     function(position.get_id(), rest...);
   }
 }
+#pragma GCC diagnostic pop
 
 // Visits the items [begin, end) of a range in row-major order.
 template <int Dimensions, typename Visit>

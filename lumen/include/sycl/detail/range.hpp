@@ -35,6 +35,23 @@ class coordinates {
     return !(a == b);
   }
 
+  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  SYCL_EXTERNAL friend bool operator==(const Derived<Dimensions>& a, Integer b) {
+    return a[0] == static_cast<std::size_t>(b);
+  }
+  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  SYCL_EXTERNAL friend bool operator==(Integer a, const Derived<Dimensions>& b) {
+    return b == a;
+  }
+  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  SYCL_EXTERNAL friend bool operator!=(const Derived<Dimensions>& a, Integer b) {
+    return !(a == b);
+  }
+  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  SYCL_EXTERNAL friend bool operator!=(Integer a, const Derived<Dimensions>& b) {
+    return !(b == a);
+  }
+
 // Integral operands are templates: with a plain size_t the built-in operator would tie
 // with these for id<1>, which converts to size_t.
 #define LUMEN_COORDINATES_BINARY(op)                                                         \
