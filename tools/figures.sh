@@ -67,10 +67,7 @@ tests=$(seconds ctest --test-dir "$out/build" -j "$jobs")
 sycl=$(include_cost sycl/sycl.hpp)
 umbrella=$(include_cost kestrel/tarn/rng.hpp)
 lengths=$(source_lengths)
-duplicates=n/a
-if command -v duplicates >/dev/null; then
-  duplicates=$(duplicates --seconds 60 | head -n 1)
-fi
+duplicates=$(house_files | grep -E '\.(c|h|cpp|hpp|cu|cmake)$' | sort | xargs awk -f tools/repeats.awk)
 
 row Figure "$(date +%F)" Budget
 row --- --- ---

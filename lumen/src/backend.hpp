@@ -28,8 +28,7 @@ class backend_driver {
   virtual void release(const device_record& device, usm::alloc kind, void* pointer) noexcept = 0;
 
   // Each of these returns when its work is done.
-  virtual void copy(const device_record& device, void* to, const void* from,
-                    std::size_t bytes) = 0;
+  virtual void copy(const device_record& device, void* to, const void* from, std::size_t bytes) = 0;
   virtual void fill(const device_record& device, void* to, const void* pattern,
                     std::size_t pattern_bytes, std::size_t count) = 0;
   virtual void prefetch(const device_record& device, void* pointer, std::size_t bytes) = 0;

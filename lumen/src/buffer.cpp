@@ -1,12 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // Buffer memory and the order of its users.
-#include "sycl/detail/buffer_core.hpp"
-
 #include <algorithm>
 #include <cstdlib>
 
 #include "access_record.hpp"
 #include "handler_access.hpp"
+#include "sycl/detail/buffer_core.hpp"
 #include "sycl/detail/exception.hpp"
 
 LUMEN_NAMESPACE_BEGIN
@@ -136,7 +135,9 @@ void* allocate_buffer(std::size_t bytes) {
   }
   return data;
 }
-void free_buffer(void* data) noexcept { std::free(data); }
+void free_buffer(void* data) noexcept {
+  std::free(data);
+}
 
 }  // namespace detail
 LUMEN_NAMESPACE_END

@@ -10,7 +10,9 @@ host_command::~host_command() = default;
 kernel_command::~kernel_command() = default;
 void kernel_command::run_items(std::size_t, std::size_t) const {}
 void kernel_command::run_group(group_frame&) const {}
-bool kernel_command::needs_groups() const { return false; }
+bool kernel_command::needs_groups() const {
+  return false;
+}
 void kernel_command::finish() {}
 
 }  // namespace detail

@@ -22,8 +22,7 @@ context::context(const device& dev, async_handler handler, const property_list& 
     : context(std::vector<device>{dev}, std::move(handler), properties) {}
 context::context(const std::vector<device>& devices, const property_list& properties)
     : context(devices, async_handler(), properties) {}
-context::context(const std::vector<device>& devices, async_handler handler,
-                 const property_list&)
+context::context(const std::vector<device>& devices, async_handler handler, const property_list&)
     : state_(std::make_shared<context_state>()) {
   if (devices.empty()) {
     detail::throw_invalid("a context needs a device");
@@ -37,9 +36,15 @@ context::context(const std::vector<device>& devices, async_handler handler,
   state_->handler = std::move(handler);
 }
 
-backend context::get_backend() const noexcept { return state_->devices.front().get_backend(); }
-platform context::get_platform() const { return state_->devices.front().get_platform(); }
-std::vector<device> context::get_devices() const { return state_->devices; }
+backend context::get_backend() const noexcept {
+  return state_->devices.front().get_backend();
+}
+platform context::get_platform() const {
+  return state_->devices.front().get_platform();
+}
+std::vector<device> context::get_devices() const {
+  return state_->devices;
+}
 
 template <>
 LUMEN_EXPORT platform context::get_info<info::context::platform>() const {
@@ -50,10 +55,10 @@ LUMEN_EXPORT std::vector<device> context::get_info<info::context::devices>() con
   return get_devices();
 }
 // All devices of one platform have the same abilities.
-#define LUMEN_CONTEXT_INFO(name, type)                                                \
-  template <>                                                                         \
-  LUMEN_EXPORT std::vector<type> context::get_info<info::context::name>() const {     \
-    return state_->devices.front().get_info<info::device::name>();                    \
+#define LUMEN_CONTEXT_INFO(name, type)                                            \
+  template <>                                                                     \
+  LUMEN_EXPORT std::vector<type> context::get_info<info::context::name>() const { \
+    return state_->devices.front().get_info<info::device::name>();                \
   }
 LUMEN_CONTEXT_INFO(atomic_memory_order_capabilities, memory_order)
 LUMEN_CONTEXT_INFO(atomic_fence_order_capabilities, memory_order)
@@ -79,7 +84,9 @@ context default_context(const device& dev) {
   return made.back().second;
 }
 
-device first_device(const context& ctx) { return context_state::of(ctx).devices.front(); }
+device first_device(const context& ctx) {
+  return context_state::of(ctx).devices.front();
+}
 }  // namespace detail
 
 LUMEN_NAMESPACE_END

@@ -94,8 +94,12 @@ bool device::is_gpu() const noexcept {
 bool device::is_accelerator() const noexcept {
   return record_->properties.device_type == info::device_type::accelerator;
 }
-backend device::get_backend() const noexcept { return record_->platform->kind; }
-platform device::get_platform() const { return platform(record_->platform); }
+backend device::get_backend() const noexcept {
+  return record_->platform->kind;
+}
+platform device::get_platform() const {
+  return platform(record_->platform);
+}
 bool device::has(aspect a) const {
   const std::vector<aspect>& aspects = record_->properties.aspects;
   return std::find(aspects.begin(), aspects.end(), a) != aspects.end();
@@ -109,10 +113,10 @@ void device::refuse_partition() {
                   "create_sub_devices: this device cannot be partitioned");
 }
 
-#define LUMEN_DEVICE_INFO(name, type)                                                    \
-  template <>                                                                            \
-  LUMEN_EXPORT type device::get_info<info::device::name>() const {                       \
-    return record_->properties.name;                                                     \
+#define LUMEN_DEVICE_INFO(name, type)                              \
+  template <>                                                      \
+  LUMEN_EXPORT type device::get_info<info::device::name>() const { \
+    return record_->properties.name;                               \
   }
 #include "sycl/detail/info_device.def"
 #undef LUMEN_DEVICE_INFO
@@ -160,11 +164,12 @@ std::vector<device> platform::get_devices(info::device_type type) const {
   }
   return result;
 }
-backend platform::get_backend() const noexcept { return record_->kind; }
+backend platform::get_backend() const noexcept {
+  return record_->kind;
+}
 bool platform::has(aspect a) const {
   const std::vector<device> devices = get_devices();
-  return std::all_of(devices.begin(), devices.end(),
-                     [a](const device& d) { return d.has(a); });
+  return std::all_of(devices.begin(), devices.end(), [a](const device& d) { return d.has(a); });
 }
 bool platform::has_extension(const std::string& extension) const {
   return std::find(record_->extensions.begin(), record_->extensions.end(), extension) !=

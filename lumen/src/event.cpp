@@ -18,7 +18,9 @@ void event::wait(const std::vector<event>& events) {
     e.wait();
   }
 }
-void event::wait_and_throw() { wait_and_throw({*this}); }
+void event::wait_and_throw() {
+  wait_and_throw({*this});
+}
 void event::wait_and_throw(const std::vector<event>& events) {
   wait(events);
   for (const event& e : events) {
@@ -39,8 +41,8 @@ std::vector<event> event::get_wait_list() {
 }
 
 template <>
-LUMEN_EXPORT info::event_command_status
-event::get_info<info::event::command_execution_status>() const {
+LUMEN_EXPORT info::event_command_status event::get_info<info::event::command_execution_status>()
+    const {
   if (!task_) {
     return info::event_command_status::complete;
   }
@@ -65,13 +67,12 @@ detail::task& profiled(const detail::task_ref& task) {
 }  // namespace
 
 template <>
-LUMEN_EXPORT std::uint64_t
-event::get_profiling_info<info::event_profiling::command_submit>() const {
+LUMEN_EXPORT std::uint64_t event::get_profiling_info<info::event_profiling::command_submit>()
+    const {
   return profiled(task_).submit_time;
 }
 template <>
-LUMEN_EXPORT std::uint64_t event::get_profiling_info<info::event_profiling::command_start>()
-    const {
+LUMEN_EXPORT std::uint64_t event::get_profiling_info<info::event_profiling::command_start>() const {
   detail::task& task = profiled(task_);
   task.wait();
   return task.start_time;

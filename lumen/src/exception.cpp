@@ -91,8 +91,12 @@ exception::exception(const exception& other) noexcept = default;
 exception& exception::operator=(const exception& other) noexcept = default;
 exception::~exception() = default;
 
-const char* exception::what() const noexcept { return text_->c_str(); }
-bool exception::has_context() const noexcept { return context_ != nullptr; }
+const char* exception::what() const noexcept {
+  return text_->c_str();
+}
+bool exception::has_context() const noexcept {
+  return context_ != nullptr;
+}
 context exception::get_context() const {
   if (!context_) {
     detail::throw_invalid("the exception has no context");
@@ -101,7 +105,9 @@ context exception::get_context() const {
 }
 
 namespace detail {
-void throw_invalid(const char* text) { throw exception(make_error_code(errc::invalid), text); }
+void throw_invalid(const char* text) {
+  throw exception(make_error_code(errc::invalid), text);
+}
 }  // namespace detail
 
 LUMEN_NAMESPACE_END

@@ -7,9 +7,9 @@
 #include <chrono>
 #include <cstdlib>
 #include <ctime>
+#include <unistd.h>
 
 #include <sys/prctl.h>
-#include <unistd.h>
 
 #include "settings.hpp"
 

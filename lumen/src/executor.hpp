@@ -65,7 +65,7 @@ class executor {
 
   const unsigned thread_count_;
   std::mutex mutex_;
-  std::condition_variable sleepers_;   // workers in deep sleep
+  std::condition_variable sleepers_;    // workers in deep sleep
   std::condition_variable milestones_;  // a helper left a loop, a task ended while stopping
   task* first_ready_ = nullptr;
   task* last_ready_ = nullptr;

@@ -4,9 +4,10 @@
 
 #include <atomic>
 #include <cstdint>
+#include <unistd.h>
+
 #include <linux/futex.h>
 #include <sys/syscall.h>
-#include <unistd.h>
 
 #include "sycl/detail/config.hpp"
 

@@ -87,7 +87,9 @@ void check_pointer(const void* pointer, std::size_t bytes, const char* text) {
 
 }  // namespace
 
-handler::handler(detail::queue_core& core) { group_.queue = &core; }
+handler::handler(detail::queue_core& core) {
+  group_.queue = &core;
+}
 handler::~handler() = default;
 
 void handler::depends_on(const event& dependency) {

@@ -44,12 +44,24 @@ device queue::pick(const context& ctx, const detail::selector_view& selector) {
   return *best;
 }
 
-backend queue::get_backend() const noexcept { return handle_->core->dev.get_backend(); }
-context queue::get_context() const { return handle_->core->ctx; }
-device queue::get_device() const noexcept { return handle_->core->dev; }
-bool queue::is_in_order() const noexcept { return handle_->core->in_order; }
-detail::queue_core& queue::core() const noexcept { return *handle_->core; }
-const property_list& queue::properties() const noexcept { return handle_->core->properties; }
+backend queue::get_backend() const noexcept {
+  return handle_->core->dev.get_backend();
+}
+context queue::get_context() const {
+  return handle_->core->ctx;
+}
+device queue::get_device() const noexcept {
+  return handle_->core->dev;
+}
+bool queue::is_in_order() const noexcept {
+  return handle_->core->in_order;
+}
+detail::queue_core& queue::core() const noexcept {
+  return *handle_->core;
+}
+const property_list& queue::properties() const noexcept {
+  return handle_->core->properties;
+}
 
 template <>
 LUMEN_EXPORT context queue::get_info<info::queue::context>() const {
@@ -60,12 +72,16 @@ LUMEN_EXPORT device queue::get_info<info::queue::device>() const {
   return get_device();
 }
 
-void queue::wait() { handle_->core->wait(); }
+void queue::wait() {
+  handle_->core->wait();
+}
 void queue::wait_and_throw() {
   wait();
   throw_asynchronous();
 }
-void queue::throw_asynchronous() { handle_->core->throw_asynchronous(); }
+void queue::throw_asynchronous() {
+  handle_->core->throw_asynchronous();
+}
 
 event queue::memcpy(void* to, const void* from, std::size_t bytes,
                     const std::vector<event>& after) {
@@ -77,8 +93,7 @@ event queue::memcpy(void* to, const void* from, std::size_t bytes,
 event queue::memcpy(void* to, const void* from, std::size_t bytes, const event& after) {
   return this->memcpy(to, from, bytes, std::vector<event>{after});
 }
-event queue::memset(void* pointer, int value, std::size_t bytes,
-                    const std::vector<event>& after) {
+event queue::memset(void* pointer, int value, std::size_t bytes, const std::vector<event>& after) {
   return submit([&](handler& h) {
     h.depends_on(after);
     h.memset(pointer, value, bytes);

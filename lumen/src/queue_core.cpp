@@ -32,8 +32,8 @@ queue_core::queue_core(const context& owner, const device& where, const async_ha
       dev(where),
       record(device_record::of(where)),
       properties(wanted),
-      in_order(wanted.has<property::queue::in_order>()),
-      profiling(wanted.has<property::queue::enable_profiling>()),
+      in_order(detail::property_access::has<property::queue::in_order>(wanted)),
+      profiling(detail::property_access::has<property::queue::enable_profiling>(wanted)),
       handler_(handler ? handler : context_state::of(owner).handler) {}
 
 void queue_core::add(task& added) {

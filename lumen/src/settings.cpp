@@ -39,8 +39,7 @@ std::vector<piece> split(const piece& whole, char separator) {
 }
 
 // Reads one setting into the device; the error, if any, with its column.
-bool read_setting(const piece& part, virtual_device_setting& device,
-                  virtual_device_parse& result) {
+bool read_setting(const piece& part, virtual_device_setting& device, virtual_device_parse& result) {
   const auto fail = [&result](const std::string& text, std::size_t column) {
     result.error = text;
     result.column = column;

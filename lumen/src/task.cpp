@@ -35,7 +35,9 @@ task_ref::task_ref(const task_ref& other) noexcept : task_(other.task_) {
     task_->retain();
   }
 }
-void task_ref::release() noexcept { task_->release(); }
+void task_ref::release() noexcept {
+  task_->release();
+}
 
 task::task(std::shared_ptr<queue_core> queue, command_group&& group)
     : queue_(std::move(queue)),
@@ -61,7 +63,9 @@ void task::depend_on(task& other) {
   dependencies_.push_back(share(other));
 }
 
-void task::finish_linking() { dependency_done(); }
+void task::finish_linking() {
+  dependency_done();
+}
 
 void task::dependency_done() {
   if (unmet_.fetch_sub(1, std::memory_order_acq_rel) == 1) {

@@ -72,8 +72,8 @@ constexpr std::size_t least_alignment = 64;
 
 }  // namespace
 
-void* aligned_alloc(std::size_t alignment, std::size_t bytes, const device& dev,
-                    const context& ctx, usm::alloc kind, const property_list&) {
+void* aligned_alloc(std::size_t alignment, std::size_t bytes, const device& dev, const context& ctx,
+                    usm::alloc kind, const property_list&) {
   const auto& owner = detail::context_state::shared(ctx);
   if (std::find(owner->devices.begin(), owner->devices.end(), dev) == owner->devices.end()) {
     throw exception(make_error_code(errc::invalid), "the device is not of the context");

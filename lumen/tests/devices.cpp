@@ -27,9 +27,11 @@ TEST(devices, default_is_the_host_and_selectors_find_the_others) {
   EXPECT_TRUE(sycl::device(sycl::cpu_selector_v).is_cpu());
   EXPECT_TRUE(sycl::device(sycl::gpu_selector_v).is_gpu());
   EXPECT_TRUE(sycl::queue(sycl::accelerator_selector_v).get_device().is_accelerator());
-  EXPECT_TRUE(sycl::device(sycl::aspect_selector(sycl::aspect::emulated, sycl::aspect::gpu)).is_gpu());
-  EXPECT_TRUE(sycl::device([](const sycl::device& d) { return d.is_accelerator() ? 7 : -1; })
-                  .is_accelerator());
+  EXPECT_TRUE(
+      sycl::device(sycl::aspect_selector(sycl::aspect::emulated, sycl::aspect::gpu)).is_gpu());
+  EXPECT_TRUE(sycl::device([](const sycl::device& d) {
+                return d.is_accelerator() ? 7 : -1;
+              }).is_accelerator());
 }
 
 TEST(devices, no_acceptable_device_is_a_runtime_error) {
@@ -75,15 +77,13 @@ TEST_P(device_queries, answers_are_consistent) {
   EXPECT_FALSE(d.get_info<info::driver_version>().empty());
   EXPECT_GE(d.get_info<info::max_compute_units>(), 1U);
   EXPECT_EQ(d.get_info<info::max_work_item_dimensions>(), 3U);
-  EXPECT_EQ(d.get_info<info::max_work_item_sizes<3>>()[2],
-            d.get_info<info::max_work_group_size>());
+  EXPECT_EQ(d.get_info<info::max_work_item_sizes<3>>()[2], d.get_info<info::max_work_group_size>());
   EXPECT_GT(d.get_info<info::global_mem_size>(), d.get_info<info::local_mem_size>());
   EXPECT_GE(d.get_info<info::local_mem_size>(), 32768U);
   EXPECT_EQ(d.get_info<info::address_bits>(), 64U);
   EXPECT_EQ(d.get_info<info::sub_group_sizes>(), std::vector<std::size_t>{1});
   EXPECT_EQ(d.get_info<info::aspects>().empty(), false);
-  EXPECT_EQ(d.has(sycl::aspect::cpu) + d.has(sycl::aspect::gpu) +
-                d.has(sycl::aspect::accelerator),
+  EXPECT_EQ(d.has(sycl::aspect::cpu) + d.has(sycl::aspect::gpu) + d.has(sycl::aspect::accelerator),
             1);
   EXPECT_EQ(d.has(sycl::aspect::emulated), !d.is_cpu());
   EXPECT_TRUE(d.has(sycl::aspect::fp64));
@@ -92,8 +92,7 @@ TEST_P(device_queries, answers_are_consistent) {
   EXPECT_EQ(d.get_info<info::platform>(), d.get_platform());
   EXPECT_EQ(code_of([&] { d.get_info<info::parent_device>(); }), sycl::errc::invalid);
   constexpr auto equally = sycl::info::partition_property::partition_equally;
-  EXPECT_EQ(code_of([&] { d.create_sub_devices<equally>(2); }),
-            sycl::errc::feature_not_supported);
+  EXPECT_EQ(code_of([&] { d.create_sub_devices<equally>(2); }), sycl::errc::feature_not_supported);
 }
 LUMEN_ON_EVERY_DEVICE(device_queries);
 

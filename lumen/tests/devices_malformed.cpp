@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // A process with a malformed LUMEN_VIRTUAL_DEVICES: one line on the error stream at the first
 // enumeration, and the host alone.
-#include <gtest/gtest.h>
-
 #include <sycl/sycl.hpp>
+
+#include <gtest/gtest.h>
 
 TEST(malformed_virtual_devices, are_reported_once_and_leave_the_host_alone) {
   testing::internal::CaptureStderr();

@@ -164,7 +164,8 @@ struct counted {
 TEST_P(groups, parked_items_are_unwound_when_one_throws) {
   std::atomic<int> alive{0};
   int errors = 0;
-  sycl::queue q(device(), [&](sycl::exception_list list) { errors += static_cast<int>(list.size()); });
+  sycl::queue q(device(),
+                [&](sycl::exception_list list) { errors += static_cast<int>(list.size()); });
   q.parallel_for(sycl::nd_range<1>(64, 64), [&alive](sycl::nd_item<1> i) {
      const counted object(alive);
      sycl::group_barrier(i.get_group());
@@ -233,7 +234,8 @@ TEST_P(groups, joint_algorithms_equal_serial_loops) {
      const bool found = sycl::joint_any_of(g, first, last, [](int x) { return x == 0; }) &&
                         sycl::joint_none_of(g, first, last, [](int x) { return x == 1000; }) &&
                         sycl::joint_all_of(g, first, last, [](int x) { return x < 1000; });
-     t[i.get_local_id(0)] = ends && found ? sycl::joint_reduce(g, first, last, sycl::plus<int>()) : -1;
+     t[i.get_local_id(0)] =
+         ends && found ? sycl::joint_reduce(g, first, last, sycl::plus<int>()) : -1;
    }).wait();
   int sum = 0;
   for (std::size_t i = 0; i < in.size(); ++i) {
@@ -265,8 +267,8 @@ TEST_P(groups, asynchronous_copies_with_strides) {
         block[63 - l] = right;
         sycl::group_barrier(i.get_group());
         const auto g = i.get_group();
-        g.wait_for(
-            g.async_work_group_copy(target.get_multi_ptr<yes>(), block.get_multi_ptr<yes>(), 64, 2));
+        g.wait_for(g.async_work_group_copy(target.get_multi_ptr<yes>(), block.get_multi_ptr<yes>(),
+                                           64, 2));
       });
     });
   }

@@ -19,8 +19,9 @@ TEST_P(kernels, every_item_of_a_range_runs_once_with_its_ids) {
   EXPECT_EQ(visits, std::vector<int>(sizes.size(), 1));
   std::vector<int> flat(100003);
   int* out = flat.data();
-  q.parallel_for(sycl::range<1>(flat.size()), [=](sycl::id<1> i) { out[i] += static_cast<int>(i); })
-      .wait();
+  q.parallel_for(sycl::range<1>(flat.size()), [=](sycl::id<1> i) {
+     out[i] += static_cast<int>(i);
+   }).wait();
   std::vector<int> expected(flat.size());
   std::iota(expected.begin(), expected.end(), 0);
   EXPECT_EQ(flat, expected);
@@ -37,7 +38,8 @@ TEST_P(kernels, all_forms_of_the_argument_are_taken) {
   int* out = values;
   q.parallel_for(1, functor{out});
   q.parallel_for(sycl::range<1>(1), [=](int i) { out[1] = i + 2; });
-  q.parallel_for<class named>(sycl::range<1>(1), [=](auto i) { out[2] = static_cast<int>(i[0]) + 3; });
+  q.parallel_for<class named>(sycl::range<1>(1),
+                              [=](auto i) { out[2] = static_cast<int>(i[0]) + 3; });
   q.parallel_for(sycl::range<1>(1), [=](std::size_t i) { out[3] = static_cast<int>(i) + 4; });
   q.single_task<class alone>([=] { out[4] = 5; });
   q.wait();
@@ -92,8 +94,9 @@ TEST_P(kernels, offsets_shift_ids) {
   std::vector<std::size_t> ids(4);
   std::size_t* out = ids.data();
   q.submit([&](sycl::handler& h) {
-     h.parallel_for(sycl::range<1>(4), sycl::id<1>(10),
-                    [=](sycl::item<1> i) { out[i.get_linear_id()] = i.get_id(0) + i.get_offset()[0]; });
+     h.parallel_for(sycl::range<1>(4), sycl::id<1>(10), [=](sycl::item<1> i) {
+       out[i.get_linear_id()] = i.get_id(0) + i.get_offset()[0];
+     });
    }).wait();
   EXPECT_EQ(ids, (std::vector<std::size_t>{20, 21, 22, 23}));
 }
@@ -105,7 +108,8 @@ TEST_P(kernels, reductions_combine_all_items) {
   *sum = 1000;
   *most = -1;
   q.parallel_for(sycl::range<1>(10000), sycl::reduction(sum, sycl::plus<>()),
-                 sycl::reduction(most, sycl::maximum<int>()), [=](sycl::id<1> i, auto& s, auto& m) {
+                 sycl::reduction(most, sycl::maximum<int>()),
+                 [=](sycl::id<1> i, auto& s, auto& m) {
                    s += static_cast<long>(i[0]);
                    m.combine(static_cast<int>(i[0] * 7919 % 10007));
                  })

@@ -22,6 +22,10 @@ void add_hundred(sycl::queue q, Buffer& buffer) {
 }
 }  // namespace
 
+static_assert(sycl::is_device_copyable_v<sycl::accessor<int, 2>>);
+static_assert(sycl::is_device_copyable_v<sycl::local_accessor<int, 2>>);
+static_assert(sycl::is_device_copyable_v<sycl::nd_range<3>>);
+
 class buffers : public on_every_device {};
 
 TEST_P(buffers, write_back_to_the_host_pointer_at_destruction_only) {
@@ -53,34 +57,56 @@ TEST_P(buffers, each_constructor_writes_back_as_promised) {
   EXPECT_EQ(after([](auto& v) { return sycl::buffer<int>(v); }, data), 100);
   data = original;
   EXPECT_EQ(after([](auto& v) { return sycl::buffer<int>(v.begin(), v.end()); }, data), 0);
-  EXPECT_EQ(after([](auto& v) {
-              return sycl::buffer<int>(static_cast<const int*>(v.data()), sycl::range<1>(v.size()));
-            }, data), 0);
-  EXPECT_EQ(after([](auto& v) {
-              sycl::buffer<int> b(v.data(), sycl::range<1>(v.size()));
-              b.set_write_back(false);
-              return b;
-            }, data), 0);
-  EXPECT_EQ(after([](auto& v) {
-              sycl::buffer<int> b(v.data(), sycl::range<1>(v.size()));
-              b.set_final_data();
-              return b;
-            }, data), 0);
-  EXPECT_EQ(after([](auto& v) {
-              sycl::buffer<int> b(v.begin(), v.end());
-              b.set_final_data(v.data());
-              return b;
-            }, data), 100);
+  EXPECT_EQ(after(
+                [](auto& v) {
+                  return sycl::buffer<int>(static_cast<const int*>(v.data()),
+                                           sycl::range<1>(v.size()));
+                },
+                data),
+            0);
+  EXPECT_EQ(after(
+                [](auto& v) {
+                  sycl::buffer<int> b(v.data(), sycl::range<1>(v.size()));
+                  b.set_write_back(false);
+                  return b;
+                },
+                data),
+            0);
+  EXPECT_EQ(after(
+                [](auto& v) {
+                  sycl::buffer<int> b(v.data(), sycl::range<1>(v.size()));
+                  b.set_final_data();
+                  return b;
+                },
+                data),
+            0);
+  EXPECT_EQ(after(
+                [](auto& v) {
+                  sycl::buffer<int> b(v.begin(), v.end());
+                  b.set_final_data(v.data());
+                  return b;
+                },
+                data),
+            100);
   data = original;
-  EXPECT_EQ(after([](auto& v) {
-              return sycl::buffer<int>(v.data(), sycl::range<1>(v.size()),
-                                       sycl::property::buffer::use_host_ptr());
-            }, data), 100);
+  EXPECT_EQ(after(
+                [](auto& v) {
+                  return sycl::buffer<int>(v.data(), sycl::range<1>(v.size()),
+                                           sycl::property::buffer::use_host_ptr());
+                },
+                data),
+            100);
   auto shared = std::make_shared<int>(5);
-  { sycl::buffer<int> b(shared, sycl::range<1>(1)); add_hundred(q, b); }
+  {
+    sycl::buffer<int> b(shared, sycl::range<1>(1));
+    add_hundred(q, b);
+  }
   EXPECT_EQ(*shared, 105);
   std::shared_ptr<int[]> array(new int[2]{1, 2});
-  { sycl::buffer<int> b(array, sycl::range<1>(2)); add_hundred(q, b); }
+  {
+    sycl::buffer<int> b(array, sycl::range<1>(2));
+    add_hundred(q, b);
+  }
   EXPECT_EQ(array[1], 102);
 }
 
@@ -113,10 +139,17 @@ TEST_P(buffers, sub_buffers_share_memory_and_order) {
   EXPECT_EQ(data[47], 247);
   EXPECT_EQ(data[48], 148);
   sycl::buffer<int, 2> plane(sycl::range<2>(8, 8));
-  EXPECT_EQ(code_of([&] { sycl::buffer<int, 2> rows(plane, {2, 0}, {3, 8}); }), sycl::errc::success);
-  EXPECT_EQ(code_of([&] { sycl::buffer<int, 2> piece(plane, {2, 3}, {1, 4}); }),
+  EXPECT_EQ(code_of([&] {
+              sycl::buffer<int, 2> rows(plane, {2, 0}, {3, 8});
+            }),
             sycl::errc::success);
-  EXPECT_EQ(code_of([&] { sycl::buffer<int, 2> column(plane, {0, 0}, {8, 4}); }),
+  EXPECT_EQ(code_of([&] {
+              sycl::buffer<int, 2> piece(plane, {2, 3}, {1, 4});
+            }),
+            sycl::errc::success);
+  EXPECT_EQ(code_of([&] {
+              sycl::buffer<int, 2> column(plane, {0, 0}, {8, 4});
+            }),
             sycl::errc::invalid);
 }
 

@@ -2,6 +2,8 @@
 // Queues, events and the scheduler: order, dependencies, who runs a task, errors, times.
 #include <atomic>
 #include <chrono>
+#include <cstdio>
+#include <cstdlib>
 #include <random>
 #include <thread>
 
@@ -66,9 +68,8 @@ TEST(scheduler, a_task_nobody_waits_for_still_runs) {
 TEST(scheduler, a_waiter_does_not_run_unrelated_tasks) {
   sycl::queue q;
   std::atomic<bool> gate{false};
-  sycl::event closed = q.submit([&](sycl::handler& h) {
-    h.host_task([&] { EXPECT_TRUE(becomes_true(gate)); });
-  });
+  sycl::event closed =
+      q.submit([&](sycl::handler& h) { h.host_task([&] { EXPECT_TRUE(becomes_true(gate)); }); });
   sycl::event free = q.submit([](sycl::handler& h) { h.host_task([] {}); });
   free.wait();
   gate = true;
@@ -272,9 +273,8 @@ TEST(events, default_constructed_is_complete) {
 TEST(events, wait_list_and_status_show_the_graph) {
   sycl::queue q;
   std::atomic<bool> gate{false};
-  sycl::event first = q.submit([&](sycl::handler& h) {
-    h.host_task([&] { EXPECT_TRUE(becomes_true(gate)); });
-  });
+  sycl::event first =
+      q.submit([&](sycl::handler& h) { h.host_task([&] { EXPECT_TRUE(becomes_true(gate)); }); });
   sycl::event second = q.submit([&](sycl::handler& h) {
     h.depends_on(first);
     h.host_task([] {});
@@ -306,4 +306,31 @@ TEST(events, profiling_times_are_ordered_and_need_the_property) {
   sycl::event without = sycl::queue().single_task([] {});
   EXPECT_EQ(code_of([&] { without.get_profiling_info<times::command_end>(); }),
             sycl::errc::invalid);
+}
+
+TEST(process_exit_deathtest, finishes_what_was_submitted) {
+  testing::FLAGS_gtest_death_test_style = "threadsafe";
+  const auto leave = [] {
+    auto* kept = new sycl::queue;  // never destroyed, as an object that outlives the runtime
+    sycl::event first = kept->submit([](sycl::handler& h) {
+      h.host_task([] { std::this_thread::sleep_for(std::chrono::milliseconds(5)); });
+    });
+    kept->submit([&](sycl::handler& h) {
+      h.depends_on(first);
+      h.host_task([] { std::fputs("the last task ran", stderr); });
+    });
+    std::exit(0);
+  };
+  EXPECT_EXIT(leave(), testing::ExitedWithCode(0), "the last task ran");
+}
+
+TEST(process_exit_deathtest, an_error_without_handler_ends_the_process) {
+  testing::FLAGS_gtest_death_test_style = "threadsafe";
+  const auto fail = [] {
+    sycl::queue q;
+    q.submit([](sycl::handler& h) {
+       h.host_task([] { throw std::runtime_error("nobody cares"); });
+     }).wait_and_throw();
+  };
+  EXPECT_DEATH(fail(), "unhandled asynchronous error: nobody cares");
 }

@@ -72,16 +72,20 @@ weibull<RealType, Method>::weibull(RealType alpha, RealType a, RealType beta)
     : alpha_(alpha), a_(a), beta_(beta) {}
 
 template <typename RealType, typename Method>
-rayleigh<RealType, Method>::rayleigh(RealType a, RealType b) : a_(a), b_(b) {}
+rayleigh<RealType, Method>::rayleigh(RealType a, RealType b)
+    : detail::location_scale<RealType, Method>(a, b) {}
 
 template <typename RealType, typename Method>
-gumbel<RealType, Method>::gumbel(RealType a, RealType b) : a_(a), b_(b) {}
+gumbel<RealType, Method>::gumbel(RealType a, RealType b)
+    : detail::location_scale<RealType, Method>(a, b) {}
 
 template <typename RealType, typename Method>
-laplace<RealType, Method>::laplace(RealType a, RealType b) : a_(a), b_(b) {}
+laplace<RealType, Method>::laplace(RealType a, RealType b)
+    : detail::location_scale<RealType, Method>(a, b) {}
 
 template <typename RealType, typename Method>
-cauchy<RealType, Method>::cauchy(RealType a, RealType b) : a_(a), b_(b) {}
+cauchy<RealType, Method>::cauchy(RealType a, RealType b)
+    : detail::location_scale<RealType, Method>(a, b) {}
 
 template <typename RealType, matrix_layout Layout, typename Method>
 gaussian_mv<RealType, Layout, Method>::gaussian_mv(std::uint32_t dimension,

@@ -10,6 +10,7 @@
 #include "detail/config.hpp"
 #include "detail/context.hpp"
 #include "detail/device.hpp"
+#include "detail/device_copyable.hpp"
 #include "detail/event.hpp"
 #include "detail/exception.hpp"
 #include "detail/functional.hpp"

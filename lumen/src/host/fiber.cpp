@@ -4,10 +4,10 @@
 #include "fiber.hpp"
 
 #include <new>
+#include <unistd.h>
 
 #include <boost/context/detail/fcontext.hpp>
 #include <sys/mman.h>
-#include <unistd.h>
 
 #if defined(__SANITIZE_ADDRESS__)
 #define LUMEN_ASAN 1
@@ -93,8 +93,8 @@ fiber::fiber(void (*entry)(void*), void* argument, std::size_t colour)
   (void)mprotect(mapping_, guard, PROT_NONE);
   char* top = mapping_ + guard + stack_bytes - (colour % colours) * colour_step;
   point.owner = this;
-  point.context = context::make_fcontext(
-      top, static_cast<std::size_t>(top - (mapping_ + guard)), &fiber_start::run);
+  point.context = context::make_fcontext(top, static_cast<std::size_t>(top - (mapping_ + guard)),
+                                         &fiber_start::run);
   point.stack_bottom = mapping_ + guard;
   point.stack_size = static_cast<std::size_t>(top - (mapping_ + guard));
 #if LUMEN_TSAN

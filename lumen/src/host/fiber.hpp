@@ -14,7 +14,7 @@ namespace detail {
 class fiber;
 struct switch_point {
   void* context = nullptr;
-  fiber* owner = nullptr;         // null for a thread's own stack
+  fiber* owner = nullptr;          // null for a thread's own stack
   switch_point* target = nullptr;  // where the last switch from here went
   // For the sanitizers only.
   void* fake_stack = nullptr;

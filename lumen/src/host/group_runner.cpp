@@ -24,7 +24,9 @@ std::exception_ptr divergence() {
 }
 }  // namespace
 
-void group_wait(group_frame& frame) { static_cast<group_runner&>(frame).wait_here(); }
+void group_wait(group_frame& frame) {
+  static_cast<group_runner&>(frame).wait_here();
+}
 
 group_runner& group_runner::of_this_thread() {
   static thread_local group_runner runner;
@@ -45,8 +47,8 @@ group_runner::worker& group_runner::worker_at(std::size_t number) {
   return *workers_[number];
 }
 
-void group_runner::run(const kernel_command& kernel, const launch_shape& shape,
-                       std::size_t begin, std::size_t end) {
+void group_runner::run(const kernel_command& kernel, const launch_shape& shape, std::size_t begin,
+                       std::size_t end) {
   kernel_ = &kernel;
   item_count = 1;
   for (int d = 0; d < 3; ++d) {

@@ -5,7 +5,6 @@
 
 #include <cstdio>
 #include <cstring>
-
 #include <unistd.h>
 
 #include "../settings.hpp"
@@ -83,10 +82,12 @@ device_properties host_properties() {
   p.max_mem_alloc_size = p.global_mem_size;
   p.max_parameter_size = 4096;
   p.mem_base_addr_align = 1024;  // bits: the widest vector
-  const std::vector<info::fp_config> fp = {info::fp_config::denorm, info::fp_config::inf_nan,
+  const std::vector<info::fp_config> fp = {info::fp_config::denorm,
+                                           info::fp_config::inf_nan,
                                            info::fp_config::round_to_nearest,
                                            info::fp_config::round_to_zero,
-                                           info::fp_config::round_to_inf, info::fp_config::fma,
+                                           info::fp_config::round_to_inf,
+                                           info::fp_config::fma,
                                            info::fp_config::correctly_rounded_divide_sqrt};
   p.single_fp_config = fp;
   p.double_fp_config = fp;

@@ -114,7 +114,9 @@ class host_driver final : public backend_driver {
 
 }  // namespace
 
-std::unique_ptr<backend_driver> make_host_driver() { return std::make_unique<host_driver>(); }
+std::unique_ptr<backend_driver> make_host_driver() {
+  return std::make_unique<host_driver>();
+}
 
 }  // namespace detail
 LUMEN_NAMESPACE_END

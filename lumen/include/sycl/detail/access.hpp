@@ -72,7 +72,9 @@ struct tag_traits<mode_target_tag_t<Mode, Target>> {
   static constexpr sycl::target target = Target;
 };
 
-constexpr bool mode_writes(access_mode mode) { return mode != access_mode::read; }
+constexpr bool mode_writes(access_mode mode) {
+  return mode != access_mode::read;
+}
 }  // namespace detail
 
 LUMEN_NAMESPACE_END

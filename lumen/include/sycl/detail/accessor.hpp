@@ -151,12 +151,12 @@ struct find_tag<First, Rest...>
 
 template <typename T, int D, typename A, typename... Rest>
 accessor(buffer<T, D, A>&, handler&, const Rest&...)
-    ->accessor<T, D, detail::find_tag<Rest...>::mode, detail::find_tag<Rest...>::target,
-               access::placeholder::false_t>;
+    -> accessor<T, D, detail::find_tag<Rest...>::mode, detail::find_tag<Rest...>::target,
+                access::placeholder::false_t>;
 template <typename T, int D, typename A, typename... Rest>
 accessor(buffer<T, D, A>&, const Rest&...)
-    ->accessor<T, D, detail::find_tag<Rest...>::mode, detail::find_tag<Rest...>::target,
-               access::placeholder::true_t>;
+    -> accessor<T, D, detail::find_tag<Rest...>::mode, detail::find_tag<Rest...>::target,
+                access::placeholder::true_t>;
 
 // Access from the host program: waits for the buffer, and locks command groups out until the
 // last copy is destroyed.
@@ -189,8 +189,7 @@ class host_accessor : public detail::window<detail::element_for<DataT, Mode>, Di
                 const property_list& = {})
       : base(detail::buffer_access::data(source), source.get_range(), part, offset) {
     detail::check_window(source.get_range(), part, offset);
-    hold_ =
-        detail::hold_for_host(detail::buffer_access::core(source), detail::mode_writes(Mode));
+    hold_ = detail::hold_for_host(detail::buffer_access::core(source), detail::mode_writes(Mode));
   }
   template <typename Allocator, access_mode M>
   host_accessor(buffer_of<Allocator>& source, range<Dimensions> part, id<Dimensions> offset,
@@ -214,7 +213,7 @@ class host_accessor : public detail::window<detail::element_for<DataT, Mode>, Di
 
 template <typename T, int D, typename A, typename... Rest>
 host_accessor(buffer<T, D, A>&, const Rest&...)
-    ->host_accessor<T, D, detail::find_tag<Rest...>::mode>;
+    -> host_accessor<T, D, detail::find_tag<Rest...>::mode>;
 
 LUMEN_NAMESPACE_END
 

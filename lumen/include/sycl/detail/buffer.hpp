@@ -64,11 +64,10 @@ class typed_buffer final : public buffer_core {
 struct buffer_access;
 
 template <typename Container, typename T>
-using enable_if_container =
-    std::enable_if_t<std::is_convertible_v<decltype(std::data(std::declval<Container&>())),
-                                           const T*> &&
-                         !std::is_array_v<Container>,
-                     decltype(std::size(std::declval<Container&>()))>;
+using enable_if_container = std::enable_if_t<
+    std::is_convertible_v<decltype(std::data(std::declval<Container&>())), const T*> &&
+        !std::is_array_v<Container>,
+    decltype(std::size(std::declval<Container&>()))>;
 }  // namespace detail
 
 template <typename T, int Dimensions = 1,
@@ -85,8 +84,7 @@ class buffer {
 
   buffer(const range<Dimensions>& sizes, const property_list& properties = {})
       : buffer(sizes, AllocatorT{}, properties) {}
-  buffer(const range<Dimensions>& sizes, AllocatorT allocator,
-         const property_list& properties = {})
+  buffer(const range<Dimensions>& sizes, AllocatorT allocator, const property_list& properties = {})
       : range_(sizes), properties_(properties) {
     make(nullptr, allocator);
   }
@@ -96,7 +94,7 @@ class buffer {
   buffer(T* host_data, const range<Dimensions>& sizes, AllocatorT allocator,
          const property_list& properties = {})
       : range_(sizes), properties_(properties) {
-    if (properties.has<property::buffer::use_host_ptr>()) {
+    if (detail::property_access::has<property::buffer::use_host_ptr>(properties)) {
       make(host_data, allocator);
     } else {
       make(nullptr, allocator);
@@ -120,8 +118,8 @@ class buffer {
   buffer(const std::shared_ptr<T>& host_data, const range<Dimensions>& sizes,
          const property_list& properties = {})
       : buffer(host_data, sizes, AllocatorT{}, properties) {}
-  buffer(const std::shared_ptr<T>& host_data, const range<Dimensions>& sizes,
-         AllocatorT allocator, const property_list& properties = {})
+  buffer(const std::shared_ptr<T>& host_data, const range<Dimensions>& sizes, AllocatorT allocator,
+         const property_list& properties = {})
       : range_(sizes), properties_(properties) {
     from_shared(host_data, host_data.get(), allocator);
   }
@@ -262,7 +260,12 @@ class buffer {
 
   template <typename Property>
   bool has_property() const noexcept {
-    return properties_.has<Property>();
+    return detail::property_access::has<Property>(properties_);
+  }
+
+  template <typename Property>
+  Property get_property() const {
+    return detail::property_access::get<Property>(properties_);
   }
 
   friend bool operator==(const buffer& a, const buffer& b) {
@@ -291,7 +294,8 @@ class buffer {
   void load(const T* from) { std::copy_n(from, range_.size(), core().elements()); }
   template <typename Shared>
   void from_shared(const Shared& shared, T* raw, const AllocatorT& allocator) {
-    make(properties_.has<property::buffer::use_host_ptr>() ? raw : nullptr, allocator);
+    make(detail::property_access::has<property::buffer::use_host_ptr>(properties_) ? raw : nullptr,
+         allocator);
     if (raw != nullptr) {
       load_unless_same(raw);
     }
@@ -324,15 +328,15 @@ class buffer {
 
 template <typename T, int Dimensions, typename Allocator>
 buffer(const T*, const range<Dimensions>&, Allocator, const property_list& = {})
-    ->buffer<T, Dimensions, Allocator>;
+    -> buffer<T, Dimensions, Allocator>;
 template <typename T, int Dimensions>
-buffer(const T*, const range<Dimensions>&, const property_list& = {})->buffer<T, Dimensions>;
+buffer(const T*, const range<Dimensions>&, const property_list& = {}) -> buffer<T, Dimensions>;
 template <typename InputIterator,
           typename = typename std::iterator_traits<InputIterator>::iterator_category>
 buffer(InputIterator, InputIterator, const property_list& = {})
-    ->buffer<typename std::iterator_traits<InputIterator>::value_type, 1>;
+    -> buffer<typename std::iterator_traits<InputIterator>::value_type, 1>;
 template <typename Container, typename = typename Container::value_type>
-buffer(Container&, const property_list& = {})->buffer<typename Container::value_type, 1>;
+buffer(Container&, const property_list& = {}) -> buffer<typename Container::value_type, 1>;
 
 namespace detail {
 // How accessors reach what a buffer keeps private.

@@ -53,7 +53,8 @@ LUMEN_EXPORT void require_access(handler& group, buffer_core& core, bool writes)
 // Waits for the buffer and keeps command groups away from it until the result is destroyed.
 LUMEN_EXPORT std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core,
                                                  bool writes);
-// 64-byte aligned memory for buffers without an allocator of their own; throws errc::memory_allocation.
+// 64-byte aligned memory for buffers without an allocator of their own; throws
+// errc::memory_allocation.
 LUMEN_EXPORT void* allocate_buffer(std::size_t bytes);
 LUMEN_EXPORT void free_buffer(void* data) noexcept;
 // Each throws sycl::exception with errc::invalid and the text given.

@@ -130,8 +130,7 @@ inline detail::aspect_rating aspect_selector(const std::vector<aspect>& wanted,
                                              const std::vector<aspect>& denied = {}) {
   return {wanted, denied};
 }
-template <typename... Aspects,
-          std::enable_if_t<(std::is_same_v<Aspects, aspect> && ...), int> = 0>
+template <typename... Aspects, std::enable_if_t<(std::is_same_v<Aspects, aspect> && ...), int> = 0>
 detail::aspect_rating aspect_selector(Aspects... wanted) {
   return {{wanted...}, {}};
 }
@@ -151,8 +150,6 @@ struct hash<sycl::platform> {
 };
 template <>
 struct hash<sycl::device> {
-  size_t operator()(const sycl::device& d) const noexcept {
-    return hash<const void*>()(d.record_);
-  }
+  size_t operator()(const sycl::device& d) const noexcept { return hash<const void*>()(d.record_); }
 };
 }  // namespace std

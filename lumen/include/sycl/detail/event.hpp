@@ -61,9 +61,7 @@ class LUMEN_EXPORT event {
   template <typename Param>
   typename Param::return_type get_profiling_info() const;
 
-  friend bool operator==(const event& a, const event& b) {
-    return a.task_.get() == b.task_.get();
-  }
+  friend bool operator==(const event& a, const event& b) { return a.task_.get() == b.task_.get(); }
   friend bool operator!=(const event& a, const event& b) { return !(a == b); }
 
  private:

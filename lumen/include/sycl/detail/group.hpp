@@ -110,24 +110,21 @@ class group {
   }
   template <typename T>
   SYCL_EXTERNAL device_event async_work_group_copy(decorated_local_ptr<T> to,
-                                                   decorated_global_ptr<T> from,
-                                                   std::size_t count,
+                                                   decorated_global_ptr<T> from, std::size_t count,
                                                    std::size_t from_stride) const {
     return async_work_group_copy(to, decorated_global_ptr<const T>(from), count, from_stride);
   }
   template <typename T>
   SYCL_EXTERNAL device_event async_work_group_copy(decorated_global_ptr<T> to,
                                                    decorated_local_ptr<const T> from,
-                                                   std::size_t count,
-                                                   std::size_t to_stride) const {
+                                                   std::size_t count, std::size_t to_stride) const {
     detail::copy_share(local_linear_, frame_->item_count, to.get(), to_stride, from.get(), 1,
                        count);
     return device_event(*frame_);
   }
   template <typename T>
   SYCL_EXTERNAL device_event async_work_group_copy(decorated_global_ptr<T> to,
-                                                   decorated_local_ptr<T> from,
-                                                   std::size_t count,
+                                                   decorated_local_ptr<T> from, std::size_t count,
                                                    std::size_t to_stride) const {
     return async_work_group_copy(to, decorated_local_ptr<const T>(from), count, to_stride);
   }

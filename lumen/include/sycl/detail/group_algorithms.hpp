@@ -75,8 +75,7 @@ SYCL_EXTERNAL inline T group_broadcast(const Group& g, T x) {
 }
 template <typename Group, typename T, detail::if_group<Group> = 0>
 SYCL_EXTERNAL inline T group_broadcast(const Group& g, T x, typename Group::id_type from) {
-  return group_broadcast(
-      g, x, detail::linear_index<Group::dimensions>(from, g.get_local_range()));
+  return group_broadcast(g, x, detail::linear_index<Group::dimensions>(from, g.get_local_range()));
 }
 
 template <typename Group, typename T, typename Op, detail::if_group<Group> = 0>
@@ -186,8 +185,7 @@ SYCL_EXTERNAL inline bool joint_any_of(const Group& g, Ptr first, Ptr last, Pred
   });
 }
 template <typename Group, typename Ptr, typename Predicate, detail::if_group<Group> = 0>
-SYCL_EXTERNAL inline bool joint_none_of(const Group& g, Ptr first, Ptr last,
-                                        Predicate predicate) {
+SYCL_EXTERNAL inline bool joint_none_of(const Group& g, Ptr first, Ptr last, Predicate predicate) {
   return !joint_any_of(g, first, last, predicate);
 }
 template <typename Group, typename Ptr, typename Predicate, detail::if_group<Group> = 0>
@@ -227,8 +225,7 @@ SYCL_EXTERNAL inline OutPtr joint_exclusive_scan(const Group& g, InPtr first, In
   });
   return result + (last - first);
 }
-template <typename Group, typename InPtr, typename OutPtr, typename Op,
-          detail::if_group<Group> = 0>
+template <typename Group, typename InPtr, typename OutPtr, typename Op, detail::if_group<Group> = 0>
 SYCL_EXTERNAL inline OutPtr joint_exclusive_scan(const Group& g, InPtr first, InPtr last,
                                                  OutPtr result, Op op) {
   using T = std::remove_cv_t<std::remove_reference_t<decltype(*first)>>;
@@ -249,8 +246,7 @@ SYCL_EXTERNAL inline OutPtr joint_inclusive_scan(const Group& g, InPtr first, In
   });
   return result + (last - first);
 }
-template <typename Group, typename InPtr, typename OutPtr, typename Op,
-          detail::if_group<Group> = 0>
+template <typename Group, typename InPtr, typename OutPtr, typename Op, detail::if_group<Group> = 0>
 SYCL_EXTERNAL inline OutPtr joint_inclusive_scan(const Group& g, InPtr first, InPtr last,
                                                  OutPtr result, Op op) {
   using T = std::remove_cv_t<std::remove_reference_t<decltype(*first)>>;

@@ -168,8 +168,7 @@ class LUMEN_EXPORT handler {
   }
   void launch(const detail::launch_shape& shape, std::unique_ptr<detail::kernel_command> work);
   void run_on_host(std::unique_ptr<detail::host_command> work);
-  void fill_bytes(void* pointer, const void* pattern, std::size_t pattern_bytes,
-                  std::size_t count);
+  void fill_bytes(void* pointer, const void* pattern, std::size_t pattern_bytes, std::size_t count);
   event finish();
 
   detail::command_group group_;

@@ -18,13 +18,13 @@ struct identity_of {
   static constexpr identity_kind kind = identity_kind::unknown;
 };
 // Function objects are known by their own type of operand and in their void form.
-#define LUMEN_IDENTITY(op, condition, which)                                          \
-  template <typename T>                                                               \
-  struct identity_of<op<T>, T> {                                                      \
-    static constexpr identity_kind kind =                                             \
-        (condition) ? identity_kind::which : identity_kind::unknown;                  \
-  };                                                                                  \
-  template <typename T>                                                               \
+#define LUMEN_IDENTITY(op, condition, which)                         \
+  template <typename T>                                              \
+  struct identity_of<op<T>, T> {                                     \
+    static constexpr identity_kind kind =                            \
+        (condition) ? identity_kind::which : identity_kind::unknown; \
+  };                                                                 \
+  template <typename T>                                              \
   struct identity_of<op<void>, T> : identity_of<op<T>, T> {};
 LUMEN_IDENTITY(plus, std::is_arithmetic_v<T>, zero)
 LUMEN_IDENTITY(multiplies, std::is_arithmetic_v<T>, one)
@@ -60,17 +60,16 @@ constexpr T identity_value(identity_kind kind) {
 }  // namespace detail
 
 template <typename Op, typename T>
-struct has_known_identity
-    : std::bool_constant<detail::identity_of<Op, std::remove_cv_t<T>>::kind !=
-                         detail::identity_kind::unknown> {};
+struct has_known_identity : std::bool_constant<detail::identity_of<Op, std::remove_cv_t<T>>::kind !=
+                                               detail::identity_kind::unknown> {};
 template <typename Op, typename T>
 inline constexpr bool has_known_identity_v = has_known_identity<Op, T>::value;
 
 template <typename Op, typename T>
 struct known_identity {
   static_assert(has_known_identity_v<Op, T>, "no identity is known for this operation");
-  static constexpr T value =
-      detail::identity_value<std::remove_cv_t<T>>(detail::identity_of<Op, std::remove_cv_t<T>>::kind);
+  static constexpr T value = detail::identity_value<std::remove_cv_t<T>>(
+      detail::identity_of<Op, std::remove_cv_t<T>>::kind);
 };
 template <typename Op, typename T>
 inline constexpr T known_identity_v = known_identity<Op, T>::value;

@@ -18,9 +18,9 @@ class multi_ptr;
 
 namespace detail {
 template <access::address_space From, access::address_space To>
-inline constexpr bool space_converts =
-    From == To || (To == access::address_space::generic_space &&
-                   From != access::address_space::constant_space);
+inline constexpr bool space_converts = From == To ||
+                                       (To == access::address_space::generic_space &&
+                                        From != access::address_space::constant_space);
 }  // namespace detail
 
 template <typename ElementType, access::address_space Space,
@@ -40,20 +40,19 @@ class multi_ptr {
   SYCL_EXTERNAL explicit multi_ptr(pointer raw) : pointer_(raw) {}
   // From an accessor of the matching space.
   template <typename Accessor,
-            typename = std::enable_if_t<std::is_convertible_v<
-                decltype(&std::declval<const Accessor&>()[0]), ElementType*>>,
+            typename = std::enable_if_t<
+                std::is_convertible_v<decltype(&std::declval<const Accessor&>()[0]), ElementType*>>,
             typename = typename Accessor::reference,
             typename = std::enable_if_t<!std::is_same_v<std::remove_cv_t<Accessor>, multi_ptr> &&
                                         detail::space_converts<Accessor::pointer_space, Space>>>
-  SYCL_EXTERNAL explicit multi_ptr(const Accessor& source)
-      : pointer_(source.begin_address()) {}
+  SYCL_EXTERNAL explicit multi_ptr(const Accessor& source) : pointer_(source.begin_address()) {}
   // To more const, to another decoration, from a named space to the generic one.
   template <typename Other, access::address_space OtherSpace, access::decorated OtherDecorated,
-            typename = std::enable_if_t<std::is_convertible_v<Other*, ElementType*> &&
-                                        (std::is_void_v<ElementType> ||
-                                         std::is_same_v<std::remove_cv_t<Other>,
-                                                        std::remove_cv_t<ElementType>>) &&
-                                        detail::space_converts<OtherSpace, Space>>>
+            typename = std::enable_if_t<
+                std::is_convertible_v<Other*, ElementType*> &&
+                (std::is_void_v<ElementType> ||
+                 std::is_same_v<std::remove_cv_t<Other>, std::remove_cv_t<ElementType>>)&&detail::
+                    space_converts<OtherSpace, Space>>>
   SYCL_EXTERNAL multi_ptr(const multi_ptr<Other, OtherSpace, OtherDecorated>& other)
       : pointer_(other.get_raw()) {}
 
@@ -124,16 +123,16 @@ class multi_ptr {
     return a.pointer_ - b.pointer_;
   }
 
-#define LUMEN_POINTER_COMPARE(op)                                                      \
-  SYCL_EXTERNAL friend bool operator op(const multi_ptr& a, const multi_ptr& b) {      \
-    return reinterpret_cast<std::uintptr_t>(a.pointer_)                                \
-        op reinterpret_cast<std::uintptr_t>(b.pointer_);                               \
-  }                                                                                    \
-  SYCL_EXTERNAL friend bool operator op(const multi_ptr& a, std::nullptr_t) {          \
-    return reinterpret_cast<std::uintptr_t>(a.pointer_) op std::uintptr_t{0};          \
-  }                                                                                    \
-  SYCL_EXTERNAL friend bool operator op(std::nullptr_t, const multi_ptr& b) {          \
-    return std::uintptr_t{0} op reinterpret_cast<std::uintptr_t>(b.pointer_);          \
+#define LUMEN_POINTER_COMPARE(op)                                                 \
+  SYCL_EXTERNAL friend bool operator op(const multi_ptr& a, const multi_ptr& b) { \
+    return reinterpret_cast<std::uintptr_t>(a.pointer_)                           \
+        op reinterpret_cast<std::uintptr_t>(b.pointer_);                          \
+  }                                                                               \
+  SYCL_EXTERNAL friend bool operator op(const multi_ptr& a, std::nullptr_t) {     \
+    return reinterpret_cast<std::uintptr_t>(a.pointer_) op std::uintptr_t{0};     \
+  }                                                                               \
+  SYCL_EXTERNAL friend bool operator op(std::nullptr_t, const multi_ptr& b) {     \
+    return std::uintptr_t{0} op reinterpret_cast<std::uintptr_t>(b.pointer_);     \
   }
   LUMEN_POINTER_COMPARE(==)
   LUMEN_POINTER_COMPARE(!=)

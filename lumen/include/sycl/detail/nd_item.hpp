@@ -64,8 +64,7 @@ class nd_item {
   }
 
   // All items of the group meet here; none goes on before the last has come.
-  SYCL_EXTERNAL void barrier(
-      access::fence_space = access::fence_space::global_and_local) const {
+  SYCL_EXTERNAL void barrier(access::fence_space = access::fence_space::global_and_local) const {
     detail::group_wait(*frame_);
   }
 
@@ -113,7 +112,6 @@ SYCL_EXTERNAL inline void group_barrier(const group<Dimensions>& g,
                                         memory_scope = memory_scope::work_group) {
   detail::group_wait(detail::group_access::frame(g));
 }
-SYCL_EXTERNAL inline void group_barrier(const sub_group&,
-                                        memory_scope = memory_scope::sub_group) {}
+SYCL_EXTERNAL inline void group_barrier(const sub_group&, memory_scope = memory_scope::sub_group) {}
 
 LUMEN_NAMESPACE_END

@@ -6,10 +6,12 @@
 #include <type_traits>
 
 #include "config.hpp"
+#include "exception.hpp"
 
 LUMEN_NAMESPACE_BEGIN
 
 namespace detail {
+struct property_access;
 enum class property_bit : unsigned {
   in_order = 1,
   enable_profiling = 2,
@@ -56,9 +58,9 @@ inline constexpr bool is_property_of_v = is_property_of<Property, Object>::value
 
 class queue;
 
-#define LUMEN_PROPERTY(type, bit)                                   \
-  template <>                                                       \
-  struct is_property<type> : std::true_type {                       \
+#define LUMEN_PROPERTY(type, bit)                                           \
+  template <>                                                               \
+  struct is_property<type> : std::true_type {                               \
     static constexpr detail::property_bit mask = detail::property_bit::bit; \
   };
 LUMEN_PROPERTY(property::queue::in_order, in_order)
@@ -76,21 +78,16 @@ struct is_property_of<property::queue::enable_profiling, queue> : std::true_type
 class property_list {
  public:
   property_list() = default;
-  template <typename... Properties,
-            std::enable_if_t<(sizeof...(Properties) > 0) &&
-                                 (is_property_v<std::decay_t<Properties>> && ...),
-                             int> = 0>
+  template <
+      typename... Properties,
+      std::enable_if_t<
+          (sizeof...(Properties) > 0) && (is_property_v<std::decay_t<Properties>> && ...), int> = 0>
   property_list(Properties... properties) {
     (add(properties), ...);
   }
 
-  template <typename Property>
-  bool has() const noexcept {
-    return (bits_ & static_cast<unsigned>(is_property<Property>::mask)) != 0;
-  }
-  std::mutex* mutex() const noexcept { return mutex_; }
-
  private:
+  friend struct detail::property_access;
   template <typename Property>
   void add(const Property& property) {
     bits_ |= static_cast<unsigned>(is_property<Property>::mask);
@@ -102,5 +99,27 @@ class property_list {
   unsigned bits_ = 0;
   std::mutex* mutex_ = nullptr;
 };
+
+namespace detail {
+// How the runtime reads a list; users ask the object that they gave it to.
+struct property_access {
+  template <typename Property>
+  static bool has(const property_list& list) noexcept {
+    return (list.bits_ & static_cast<unsigned>(is_property<Property>::mask)) != 0;
+  }
+  // Throws errc::invalid unless the list has the property.
+  template <typename Property>
+  static Property get(const property_list& list) {
+    if (!has<Property>(list)) {
+      throw exception(make_error_code(errc::invalid), "the object lacks the property asked for");
+    }
+    if constexpr (std::is_same_v<Property, property::buffer::use_mutex>) {
+      return Property(*list.mutex_);
+    } else {
+      return Property();
+    }
+  }
+};
+}  // namespace detail
 
 LUMEN_NAMESPACE_END

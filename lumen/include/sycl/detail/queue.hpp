@@ -50,7 +50,12 @@ class LUMEN_EXPORT queue {
   typename Param::return_type get_info() const;
   template <typename Property>
   bool has_property() const noexcept {
-    return properties().template has<Property>();
+    return detail::property_access::has<Property>(properties());
+  }
+
+  template <typename Property>
+  Property get_property() const {
+    return detail::property_access::get<Property>(properties());
   }
 
   template <typename CommandGroup>
@@ -114,11 +119,9 @@ class LUMEN_EXPORT queue {
 
   // The commands of handler by their names: ARGUMENTS, then optionally an event or a vector of
   // events to come after.
-  event memcpy(void* to, const void* from, std::size_t bytes,
-               const std::vector<event>& after = {});
+  event memcpy(void* to, const void* from, std::size_t bytes, const std::vector<event>& after = {});
   event memcpy(void* to, const void* from, std::size_t bytes, const event& after);
-  event memset(void* pointer, int value, std::size_t bytes,
-               const std::vector<event>& after = {});
+  event memset(void* pointer, int value, std::size_t bytes, const std::vector<event>& after = {});
   event memset(void* pointer, int value, std::size_t bytes, const event& after);
   event prefetch(void* pointer, std::size_t bytes, const std::vector<event>& after = {});
   event prefetch(void* pointer, std::size_t bytes, const event& after);

@@ -22,80 +22,79 @@ class coordinates {
   SYCL_EXTERNAL std::size_t& operator[](int dimension) { return values_[dimension]; }
   SYCL_EXTERNAL std::size_t operator[](int dimension) const { return values_[dimension]; }
 
-  SYCL_EXTERNAL friend bool operator==(const Derived<Dimensions>& a,
-                                       const Derived<Dimensions>& b) {
+  SYCL_EXTERNAL friend bool operator==(const Derived<Dimensions>& a, const Derived<Dimensions>& b) {
     bool equal = true;
     for (int d = 0; d < Dimensions; ++d) {
       equal = equal && a[d] == b[d];
     }
     return equal;
   }
-  SYCL_EXTERNAL friend bool operator!=(const Derived<Dimensions>& a,
-                                       const Derived<Dimensions>& b) {
+  SYCL_EXTERNAL friend bool operator!=(const Derived<Dimensions>& a, const Derived<Dimensions>& b) {
     return !(a == b);
   }
 
-  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  template <typename Integer,
+            std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
   SYCL_EXTERNAL friend bool operator==(const Derived<Dimensions>& a, Integer b) {
     return a[0] == static_cast<std::size_t>(b);
   }
-  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  template <typename Integer,
+            std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
   SYCL_EXTERNAL friend bool operator==(Integer a, const Derived<Dimensions>& b) {
     return b == a;
   }
-  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  template <typename Integer,
+            std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
   SYCL_EXTERNAL friend bool operator!=(const Derived<Dimensions>& a, Integer b) {
     return !(a == b);
   }
-  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
+  template <typename Integer,
+            std::enable_if_t<std::is_integral_v<Integer> && Dimensions == 1, int> = 0>
   SYCL_EXTERNAL friend bool operator!=(Integer a, const Derived<Dimensions>& b) {
     return !(b == a);
   }
 
 // Integral operands are templates: with a plain size_t the built-in operator would tie
 // with these for id<1>, which converts to size_t.
-#define LUMEN_COORDINATES_BINARY(op)                                                         \
-  SYCL_EXTERNAL friend Derived<Dimensions> operator op(const Derived<Dimensions>& a,         \
-                                                       const Derived<Dimensions>& b) {       \
-    Derived<Dimensions> result = a;                                                          \
-    for (int d = 0; d < Dimensions; ++d) {                                                   \
-      result[d] = a[d] op b[d];                                                              \
-    }                                                                                        \
-    return result;                                                                           \
-  }                                                                                          \
-  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer>, int> = 0>        \
-  SYCL_EXTERNAL friend Derived<Dimensions> operator op(const Derived<Dimensions>& a,         \
-                                                       Integer b) {                          \
-    Derived<Dimensions> result = a;                                                          \
-    for (int d = 0; d < Dimensions; ++d) {                                                   \
-      result[d] = a[d] op static_cast<std::size_t>(b);                                       \
-    }                                                                                        \
-    return result;                                                                           \
-  }                                                                                          \
-  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer>, int> = 0>        \
-  SYCL_EXTERNAL friend Derived<Dimensions> operator op(Integer a,                            \
-                                                       const Derived<Dimensions>& b) {       \
-    Derived<Dimensions> result = b;                                                          \
-    for (int d = 0; d < Dimensions; ++d) {                                                   \
-      result[d] = static_cast<std::size_t>(a) op b[d];                                       \
-    }                                                                                        \
-    return result;                                                                           \
+#define LUMEN_COORDINATES_BINARY(op)                                                              \
+  SYCL_EXTERNAL friend Derived<Dimensions> operator op(const Derived<Dimensions>& a,              \
+                                                       const Derived<Dimensions>& b) {            \
+    Derived<Dimensions> result = a;                                                               \
+    for (int d = 0; d < Dimensions; ++d) {                                                        \
+      result[d] = a[d] op b[d];                                                                   \
+    }                                                                                             \
+    return result;                                                                                \
+  }                                                                                               \
+  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer>, int> = 0>             \
+  SYCL_EXTERNAL friend Derived<Dimensions> operator op(const Derived<Dimensions>& a, Integer b) { \
+    Derived<Dimensions> result = a;                                                               \
+    for (int d = 0; d < Dimensions; ++d) {                                                        \
+      result[d] = a[d] op static_cast<std::size_t>(b);                                            \
+    }                                                                                             \
+    return result;                                                                                \
+  }                                                                                               \
+  template <typename Integer, std::enable_if_t<std::is_integral_v<Integer>, int> = 0>             \
+  SYCL_EXTERNAL friend Derived<Dimensions> operator op(Integer a, const Derived<Dimensions>& b) { \
+    Derived<Dimensions> result = b;                                                               \
+    for (int d = 0; d < Dimensions; ++d) {                                                        \
+      result[d] = static_cast<std::size_t>(a) op b[d];                                            \
+    }                                                                                             \
+    return result;                                                                                \
   }
 
-#define LUMEN_COORDINATES_ASSIGN(op)                                                         \
-  SYCL_EXTERNAL friend Derived<Dimensions>& operator op(Derived<Dimensions>& a,              \
-                                                        const Derived<Dimensions>& b) {      \
-    for (int d = 0; d < Dimensions; ++d) {                                                   \
-      a[d] op b[d];                                                                          \
-    }                                                                                        \
-    return a;                                                                                \
-  }                                                                                          \
-  SYCL_EXTERNAL friend Derived<Dimensions>& operator op(Derived<Dimensions>& a,              \
-                                                        std::size_t b) {                     \
-    for (int d = 0; d < Dimensions; ++d) {                                                   \
-      a[d] op b;                                                                             \
-    }                                                                                        \
-    return a;                                                                                \
+#define LUMEN_COORDINATES_ASSIGN(op)                                                             \
+  SYCL_EXTERNAL friend Derived<Dimensions>& operator op(Derived<Dimensions>& a,                  \
+                                                        const Derived<Dimensions>& b) {          \
+    for (int d = 0; d < Dimensions; ++d) {                                                       \
+      a[d] op b[d];                                                                              \
+    }                                                                                            \
+    return a;                                                                                    \
+  }                                                                                              \
+  SYCL_EXTERNAL friend Derived<Dimensions>& operator op(Derived<Dimensions>& a, std::size_t b) { \
+    for (int d = 0; d < Dimensions; ++d) {                                                       \
+      a[d] op b;                                                                                 \
+    }                                                                                            \
+    return a;                                                                                    \
   }
 
   LUMEN_COORDINATES_BINARY(+)

@@ -92,9 +92,8 @@ class reduction_runs {
   template <typename Reducers>
   void keep(std::size_t first_item, Reducers& reducers) const {
     const std::lock_guard<std::mutex> lock(*mutex_);
-    runs_->emplace_back(first_item, std::apply(
-                                        [](const auto&... r) { return values(r.value()...); },
-                                        reducers));
+    runs_->emplace_back(
+        first_item, std::apply([](const auto&... r) { return values(r.value()...); }, reducers));
   }
   void finish() const {
     std::sort(runs_->begin(), runs_->end(),
@@ -143,10 +142,9 @@ class range_reduction final : public kernel_command {
     auto reducers = runs_.start();
     std::apply(
         [&](auto&... r) {
-          for_items<Dimensions>(sizes_, id<Dimensions>(), begin, end,
-                                [&](const item<Dimensions>& position) {
-                                  call_with_item(function_, position, r...);
-                                });
+          for_items<Dimensions>(
+              sizes_, id<Dimensions>(), begin, end,
+              [&](const item<Dimensions>& position) { call_with_item(function_, position, r...); });
         },
         reducers);
     runs_.keep(begin, reducers);
@@ -170,8 +168,7 @@ class nd_range_reduction final : public kernel_command {
       return;
     }
     const nd_item<Dimensions> first = nd_item_maker::make<Dimensions>(frame, frame.next_item);
-    const std::size_t number =
-        first.get_group_linear_id() * frame.item_count + frame.next_item;
+    const std::size_t number = first.get_group_linear_id() * frame.item_count + frame.next_item;
     auto reducers = runs_.start();
     while (frame.next_item < frame.item_count) {
       std::apply(
@@ -207,9 +204,15 @@ std::unique_ptr<kernel_command> reduction_work(const nd_range<Dimensions>&,
                                                                                   variables...);
 }
 
-inline launch_shape reduction_shape(const range<1>& r) { return shape_of(r, id<1>()); }
-inline launch_shape reduction_shape(const range<2>& r) { return shape_of(r, id<2>()); }
-inline launch_shape reduction_shape(const range<3>& r) { return shape_of(r, id<3>()); }
+inline launch_shape reduction_shape(const range<1>& r) {
+  return shape_of(r, id<1>());
+}
+inline launch_shape reduction_shape(const range<2>& r) {
+  return shape_of(r, id<2>());
+}
+inline launch_shape reduction_shape(const range<3>& r) {
+  return shape_of(r, id<3>());
+}
 template <int Dimensions>
 launch_shape reduction_shape(const nd_range<Dimensions>& r) {
   return shape_of(r);
@@ -244,13 +247,13 @@ template <typename T, typename Op>
 auto reduction(T* place, Op operation, const property_list& properties = {}) {
   return detail::reduction_variable<T, Op>{
       place, operation, detail::identity_or_nothing<T, Op>(),
-      !properties.has<property::reduction::initialize_to_identity>()};
+      !detail::property_access::has<property::reduction::initialize_to_identity>(properties)};
 }
 template <typename T, typename Op>
 auto reduction(T* place, const T& identity, Op operation, const property_list& properties = {}) {
   return detail::reduction_variable<T, Op>{
       place, operation, identity,
-      !properties.has<property::reduction::initialize_to_identity>()};
+      !detail::property_access::has<property::reduction::initialize_to_identity>(properties)};
 }
 // The first element of the buffer takes the total.
 template <typename T, typename Allocator, typename Op>

@@ -20,7 +20,9 @@ LUMEN_EXPORT void* aligned_alloc(std::size_t alignment, std::size_t bytes, const
                                  const property_list& properties = {});
 // Throws errc::invalid for a pointer that no allocation of the context begins at.
 LUMEN_EXPORT void free(void* pointer, const context& ctx);
-inline void free(void* pointer, const queue& q) { free(pointer, q.get_context()); }
+inline void free(void* pointer, const queue& q) {
+  free(pointer, q.get_context());
+}
 
 // The kind of the allocation that the pointer lies in, usm::alloc::unknown for any other.
 LUMEN_EXPORT usm::alloc get_pointer_type(const void* pointer, const context& ctx);

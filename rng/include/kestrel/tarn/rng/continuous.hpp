@@ -251,6 +251,26 @@ class TARN_EXPORT weibull {
   RealType beta_;
 };
 
+namespace detail {
+/// What distributions with a location `a` and a scale `b` share.
+template <typename RealType, typename Method>
+class TARN_EXPORT location_scale {
+ public:
+  using result_type = RealType;
+  using method_type = Method;
+
+  RealType a() const { return a_; }
+  RealType b() const { return b_; }
+
+ protected:
+  location_scale(RealType a, RealType b) : a_(a), b_(b) {}
+
+ private:
+  RealType a_;
+  RealType b_;
+};
+}  // namespace detail
+
 namespace rayleigh_method {
 struct TARN_EXPORT icdf {};
 struct TARN_EXPORT icdf_accurate {};  // results never below a
@@ -258,23 +278,13 @@ struct TARN_EXPORT icdf_accurate {};  // results never below a
 
 /// Rayleigh with displacement `a` and scale `b`.
 template <typename RealType = float, typename Method = rayleigh_method::icdf>
-class TARN_EXPORT rayleigh {
+class TARN_EXPORT rayleigh : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_real_result<RealType>, "rayleigh: the result type is float or double");
   static_assert(detail::is_one_of<Method, rayleigh_method::icdf, rayleigh_method::icdf_accurate>,
                 "rayleigh: no such method");
 
  public:
-  using result_type = RealType;
-  using method_type = Method;
-
   explicit rayleigh(RealType a = RealType(0), RealType b = RealType(1));
-
-  RealType a() const { return a_; }
-  RealType b() const { return b_; }
-
- private:
-  RealType a_;
-  RealType b_;
 };
 
 namespace gumbel_method {
@@ -283,22 +293,12 @@ struct TARN_EXPORT icdf {};
 
 /// Gumbel with location `a` and scale `b`.
 template <typename RealType = float, typename Method = gumbel_method::icdf>
-class TARN_EXPORT gumbel {
+class TARN_EXPORT gumbel : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_real_result<RealType>, "gumbel: the result type is float or double");
   static_assert(detail::is_one_of<Method, gumbel_method::icdf>, "gumbel: no such method");
 
  public:
-  using result_type = RealType;
-  using method_type = Method;
-
   explicit gumbel(RealType a = RealType(0), RealType b = RealType(1));
-
-  RealType a() const { return a_; }
-  RealType b() const { return b_; }
-
- private:
-  RealType a_;
-  RealType b_;
 };
 
 namespace laplace_method {
@@ -307,22 +307,12 @@ struct TARN_EXPORT icdf {};
 
 /// Laplace with mean `a` and scale `b`.
 template <typename RealType = float, typename Method = laplace_method::icdf>
-class TARN_EXPORT laplace {
+class TARN_EXPORT laplace : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_real_result<RealType>, "laplace: the result type is float or double");
   static_assert(detail::is_one_of<Method, laplace_method::icdf>, "laplace: no such method");
 
  public:
-  using result_type = RealType;
-  using method_type = Method;
-
   explicit laplace(RealType a = RealType(0), RealType b = RealType(1));
-
-  RealType a() const { return a_; }
-  RealType b() const { return b_; }
-
- private:
-  RealType a_;
-  RealType b_;
 };
 
 namespace cauchy_method {
@@ -331,22 +321,12 @@ struct TARN_EXPORT icdf {};
 
 /// Cauchy with median `a` and scale `b`.
 template <typename RealType = float, typename Method = cauchy_method::icdf>
-class TARN_EXPORT cauchy {
+class TARN_EXPORT cauchy : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_real_result<RealType>, "cauchy: the result type is float or double");
   static_assert(detail::is_one_of<Method, cauchy_method::icdf>, "cauchy: no such method");
 
  public:
-  using result_type = RealType;
-  using method_type = Method;
-
   explicit cauchy(RealType a = RealType(0), RealType b = RealType(1));
-
-  RealType a() const { return a_; }
-  RealType b() const { return b_; }
-
- private:
-  RealType a_;
-  RealType b_;
 };
 
 }  // namespace kestrel::tarn::rng
