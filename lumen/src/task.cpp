@@ -119,11 +119,12 @@ task_ref task::ready_ancestor() {
 void task::wait() {
   executor& threads = executor::instance();
   for (int spins = 0; !done();) {
-    if (threads.claim(*this)) {
+    const task_state seen = state();
+    if (seen == task_state::ready && threads.claim(*this)) {
       run();
       return;
     }
-    if (state() == task_state::pending) {
+    if (seen == task_state::pending) {
       if (const task_ref ancestor = ready_ancestor()) {
         if (threads.claim(*ancestor.get())) {
           ancestor->run();

@@ -311,11 +311,11 @@ TEST(events, profiling_times_are_ordered_and_need_the_property) {
 TEST(process_exit_deathtest, finishes_what_was_submitted) {
   testing::FLAGS_gtest_death_test_style = "threadsafe";
   const auto leave = [] {
-    auto* kept = new sycl::queue;  // never destroyed, as an object that outlives the runtime
-    sycl::event first = kept->submit([](sycl::handler& h) {
+    static sycl::queue kept;  // destroyed while the process exits
+    sycl::event first = kept.submit([](sycl::handler& h) {
       h.host_task([] { std::this_thread::sleep_for(std::chrono::milliseconds(5)); });
     });
-    kept->submit([&](sycl::handler& h) {
+    kept.submit([&](sycl::handler& h) {
       h.depends_on(first);
       h.host_task([] { std::fputs("the last task ran", stderr); });
     });

@@ -22,8 +22,9 @@ namespace kestrel::tarn::rng::detail {
 /// The backend frame. `Out` is T* or sycl::buffer<T, 1>&. Out of line, as an entry calls it in two
 /// places and there are thousands of entries.
 template <typename Distr, typename Engine, typename Out>
-[[gnu::noinline]] sycl::event generate_on_device(const Distr& distr, Engine& engine, std::int64_t n, Out r,
-                               const std::vector<sycl::event>& dependencies) {
+[[gnu::noinline]] sycl::event generate_on_device(const Distr& distr, Engine& engine, std::int64_t n,
+                                                 Out r,
+                                                 const std::vector<sycl::event>& dependencies) {
   if constexpr (is_refused<Distr, Engine>) {
     refuse_uniform_bits<Engine>();
   } else {

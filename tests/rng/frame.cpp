@@ -4,6 +4,7 @@
 #include <initializer_list>
 #include <limits>
 #include <string>
+#include <tarn_serv.h>
 #include <type_traits>
 #include <vector>
 
@@ -105,6 +106,35 @@ TEST(frame_on_a_cpu, returns_a_completed_event) {
   const sycl::event event = rng::generate(rng::uniform<float>(), engine, 1, &value);
   EXPECT_EQ(event.get_info<sycl::info::event::command_execution_status>(),
             sycl::info::event_command_status::complete);
+}
+
+// A host routine reports bad parameters by itself; no exception, nothing drawn, nothing moved.
+TEST(frame_on_a_cpu, bad_bounds_are_reported_and_write_nothing) {
+  static std::string report;
+  tarn_serv_set_xerbla_interface(
+      reinterpret_cast<void*>(+[](const char* name, const int* position, int length) {
+        report =
+            std::string(name, static_cast<std::size_t>(length)) + ":" + std::to_string(*position);
+      }),
+      0);
+  rng::philox4x32x10 engine(tarn_test::cpu_queue(), 2);
+  const auto refused = [&](const auto& distr) {
+    using T = typename std::decay_t<decltype(distr)>::result_type;
+    report.clear();
+    for (const T value : draw(distr, engine, 2500)) {
+      EXPECT_TRUE(tarn_test::same_bits(value, marker<T>()));
+    }
+    return report;
+  };
+  using accurate = rng::uniform_method::accurate;
+  EXPECT_EQ(refused(rng::uniform<float>(1.0f, 1.0f)), "rvxsRngUniform:5");
+  EXPECT_EQ(refused(rng::uniform<double>(2.0, 1.0)), "rvxdRngUniform:5");
+  EXPECT_EQ(refused(rng::uniform<std::int32_t>(3, 3)), "rvxiRngUniform:5");
+  EXPECT_EQ(refused(rng::uniform<std::int32_t, accurate>(3, 3)), "rvxdRngUniform:5");
+  EXPECT_EQ(refused(rng::uniform<std::uint32_t>(4, 3)), "rvxdRngUniform:5");
+  tarn_serv_set_xerbla_interface(nullptr, 1);
+  rng::philox4x32x10 untouched(tarn_test::cpu_queue(), 2);
+  EXPECT_EQ(draw(rng::bits<>(), engine, 5), draw(rng::bits<>(), untouched, 5));
 }
 
 TEST(frame_on_an_accelerator, constructors_refuse_the_device) {

@@ -111,6 +111,20 @@ TEST_F(report, a_refused_call_prints_nothing_and_leaves_no_depth_behind) {
   EXPECT_EQ(lines().size(), 1u);
 }
 
+// Device time comes from profiling stamps; a queue that takes none has the runtime's own error,
+// after the values have been written.
+TEST_F(report, level_2_on_a_queue_without_profiling_raises_the_runtimes_error) {
+  set_level(2);
+  rng::philox4x32x10 engine(tarn_test::cpu_queue());
+  float value = -1.0f;
+  EXPECT_THROW(rng::generate(rng::uniform<float>(), engine, 1, &value), sycl::exception);
+  EXPECT_NE(value, -1.0f);
+  EXPECT_TRUE(lines().empty());
+  set_level(1);
+  rng::generate(rng::uniform<float>(), engine, 1, &value);
+  EXPECT_EQ(lines().size(), 1u);
+}
+
 TEST_F(report, values_do_not_depend_on_the_level) {
   std::vector<std::vector<float>> drawn;
   for (int level = 0; level <= 2; ++level) {

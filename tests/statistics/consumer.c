@@ -5,7 +5,7 @@
 
 static int failures = 0;
 
-static void expect(int good, const char *what) {
+static void expect(int good, const char* what) {
   if (!good) {
     fprintf(stderr, "failed: %s\n", what);
     ++failures;

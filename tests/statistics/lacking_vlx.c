@@ -7,7 +7,7 @@
 
 static unsigned char record[64] = {0, 0, 0, 1, 1};
 
-EXPORTED int __rvxNewStreamEx(void **stream, int code, int n, const uint32_t *params) {
+EXPORTED int __rvxNewStreamEx(void** stream, int code, int n, const uint32_t* params) {
   (void)code;
   (void)n;
   (void)params;
@@ -15,7 +15,7 @@ EXPORTED int __rvxNewStreamEx(void **stream, int code, int n, const uint32_t *pa
   return 0;
 }
 
-EXPORTED int __rvxGetStreamSize(void *stream) {
+EXPORTED int __rvxGetStreamSize(void* stream) {
   (void)stream;
   return 4711;
 }

@@ -34,7 +34,7 @@ class item : public detail::number_like<item<Dimensions, WithOffset>, Dimensions
     return offset_;
   }
   template <bool O = WithOffset, std::enable_if_t<!O, int> = 0>
-  SYCL_EXTERNAL operator item<Dimensions, true>() const {
+  SYCL_EXTERNAL operator item<Dimensions, !O>() const {
     return item<Dimensions, true>(index_, sizes_, id<Dimensions>());
   }
 
