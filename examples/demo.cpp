@@ -73,8 +73,10 @@ void print_histogram(const float* values, std::int64_t count) {
 }
 
 int demonstrate() {
-  sycl::queue cpu{sycl::cpu_selector_v};
-  sycl::queue gpu{sycl::gpu_selector_v};
+  // Profiling, so that TARN_VERBOSE=2 can report device times.
+  const sycl::property_list profiling{sycl::property::queue::enable_profiling{}};
+  sycl::queue cpu{sycl::cpu_selector_v, profiling};
+  sycl::queue gpu{sycl::gpu_selector_v, profiling};
   auto* cpu_values = sycl::malloc_shared<float>(cpu_count, cpu);
   auto* gpu_values = sycl::malloc_shared<float>(gpu_count, gpu);
   if (cpu_values == nullptr || gpu_values == nullptr) {

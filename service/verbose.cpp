@@ -4,6 +4,7 @@
 #include "verbose.hpp"
 
 #include <algorithm>
+#include <atomic>
 #include <cstdint>
 #include <limits>
 #include <string>
@@ -20,7 +21,7 @@ struct verbose_thread_state {
 
 thread_local verbose_thread_state state;
 
-int verbose_iface = 2;  // the C++ interface, until set_verbose_gpu_iface(1)
+std::atomic<int> verbose_iface{2};  // the C++ interface, until set_verbose_gpu_iface(1)
 
 /// From the start of the first to the end of the last kernel, in seconds; 0 without events. Stamps
 /// are in nanoseconds.
@@ -44,6 +45,13 @@ std::string time_text(double seconds) {
   return text;
 }
 
+/// A kernel that does nothing but require the buffer.
+template <typename T>
+struct touch {
+  sycl::accessor<T, 1, sycl::access_mode::read_write> buffer;
+  SYCL_EXTERNAL void operator()() const {}
+};
+
 /// Lets earlier work on the buffer finish, so that the clock sees this call alone.
 template <typename T>
 void drain(sycl::buffer<T, 1>& buffer) {
@@ -52,8 +60,7 @@ void drain(sycl::buffer<T, 1>& buffer) {
   }
   sycl::queue queue;
   queue.submit([&](sycl::handler& group) {
-    const sycl::accessor<T, 1, sycl::access_mode::read_write> access(buffer, group);
-    group.single_task([access] { static_cast<void>(access); });
+    group.single_task(touch<T>{sycl::accessor<T, 1, sycl::access_mode::read_write>(buffer, group)});
   });
   queue.wait();
 }

@@ -31,7 +31,8 @@ void tarn_serv_exit(int code) {
     hook(code);
     return;
   }
-  std::fflush(nullptr);
+  std::fflush(stdout);  // these two only: another thread may hold the lock of some other file
+  std::fflush(stderr);
   ::_exit(code);
 }
 

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 // philox4x32x10 on the host: the engine object and its host road.
-#include <algorithm>
 #include <initializer_list>
 #include <utility>
 #include <vector>

@@ -15,9 +15,17 @@ using namespace tarn::rvx;
 
 // Bits that a method may have.
 constexpr std::int64_t accuracy_methods = RVX_RNG_METHOD_ACCURACY_FLAG;
-constexpr std::int64_t any_method = std::numeric_limits<int>::max();  // the routine judges
+constexpr std::int64_t any_method = std::numeric_limits<int>::max();  // taken as it is
 
 constexpr int parameters_good = 0;
+
+// A failure that the checks in front cannot foresee: the method's bits, or a stream that is not in
+// order. Callers may drop the status, so it has to be reported here; a missing entry has been.
+int report_failure(const char* name, int status) {
+  if (status >= 0 || status == RVX_STATUS_NO_ENTRY)
+    return status;
+  return report(name, status == -1 ? 1 : 2, status);
+}
 
 // `bad_parameter` gives the position of the first bad parameter of the distribution, or
 // parameters_good; `call(method, stream, n, r)` is the library's routine.
@@ -41,7 +49,7 @@ int routine(const char* name, std::int64_t method, std::int64_t method_bits, rvx
   const int status = in_pieces(n, r, largest_piece, [&](int count, Value* to) {
     return call(static_cast<int>(method), stream, count, to);
   });
-  return status == -1 ? report(name, 1, status) : status;
+  return report_failure(name, status);
 }
 
 template <class Value>

@@ -14,9 +14,9 @@ using namespace tarn::rvx;
 
 constexpr std::int64_t int_max = std::numeric_limits<int>::max();
 
-// Reports a failure of the library at the stream's position.
+// Reports a failure of the library at the given position; a missing entry has been reported.
 int reported(const char* name, int position, int status) {
-  return status < 0 ? report(name, position, status) : status;
+  return status < 0 && status != RVX_STATUS_NO_ENTRY ? report(name, position, status) : status;
 }
 
 int new_stream(const char* name, rvx_stream* stream, std::int64_t code, std::int64_t n,
@@ -116,7 +116,7 @@ int rvxGetStreamSize(rvx_stream stream) {
   static entry<int(rvx_stream)> call("__rvxGetStreamSize");
   if (const int status = check_stream(__func__, 1, stream); status != 0)
     return status;
-  return call(stream);
+  return reported(__func__, 1, call(stream));
 }
 
 int rvxSaveStreamM(rvx_stream stream, std::uint8_t* mem) {
@@ -125,7 +125,7 @@ int rvxSaveStreamM(rvx_stream stream, std::uint8_t* mem) {
     return status;
   if (mem == nullptr)
     return report(__func__, 2, -2);
-  return call(stream, mem);
+  return reported(__func__, 2, call(stream, mem));
 }
 
 int rvxLoadStreamM(rvx_stream* stream, const std::uint8_t* mem) {
@@ -134,7 +134,7 @@ int rvxLoadStreamM(rvx_stream* stream, const std::uint8_t* mem) {
     return status;
   if (mem == nullptr)
     return report(__func__, 2, -2);
-  return call(stream, mem);
+  return reported(__func__, 2, call(stream, mem));
 }
 
 int rvxSaveStreamF(rvx_stream stream, const char* name, int length) {
@@ -145,7 +145,7 @@ int rvxSaveStreamF(rvx_stream stream, const char* name, int length) {
     return report(__func__, 2, -2);
   if (length < -1)
     return report(__func__, 3, -3);
-  return call(stream, name, length);
+  return reported(__func__, 2, call(stream, name, length));
 }
 
 int rvxLoadStreamF(rvx_stream* stream, const char* name, int length) {
@@ -156,5 +156,5 @@ int rvxLoadStreamF(rvx_stream* stream, const char* name, int length) {
     return report(__func__, 2, -2);
   if (length < -1)
     return report(__func__, 3, -3);
-  return call(stream, name, length);
+  return reported(__func__, 2, call(stream, name, length));
 }

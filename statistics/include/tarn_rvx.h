@@ -47,20 +47,20 @@ typedef void* rvx_stream;
 /* Statuses. Other negative values name a bad argument: -k is the k-th argument. */
 #define RVX_STATUS_OK 0
 #define RVX_STATUS_NULL_STREAM (-5)
-#define RVX_STATUS_BAD_CODE (-1000) /* no engine of that code, or bad seed words */
-#define RVX_STATUS_BAD_MARK (-1006) /* not a stream, one that was deleted, or an impossible state \
-                                     */
+/* No engine of that code, or bad seed words. */
+#define RVX_STATUS_BAD_CODE (-1000)
 #define RVX_STATUS_NO_MEMORY (-1001)
-#define RVX_STATUS_UNSUPPORTED (-1002) /* the engine has no such service */
-#define RVX_STATUS_NO_ENTRY                                          \
-  (-1003) /* the library or an entry is missing, and an exit hook of \
-             the core library kept the process alive */
+/* The engine has no such service. */
+#define RVX_STATUS_UNSUPPORTED (-1002)
+/* The library lacks the entry, and an exit hook kept the process alive. */
+#define RVX_STATUS_NO_ENTRY (-1003)
+/* Not a stream, one that was deleted, or a state that its engine cannot be in. */
+#define RVX_STATUS_BAD_MARK (-1006)
 #define RVX_STATUS_FILE_OPEN (-1100)
 #define RVX_STATUS_FILE_READ (-1101)
 #define RVX_STATUS_FILE_WRITE (-1102)
-#define RVX_STATUS_BAD_IMAGE                                    \
-  (-1103) /* a damaged or foreign image: mark, version, length, \
-             checksum or an impossible field */
+/* A damaged or foreign image: mark, version, length, checksum or an impossible field. */
+#define RVX_STATUS_BAD_IMAGE (-1103)
 
 /* New stream from a seed of up to 64 bits. A seed above 0x7FFFFFFF travels as two 32-bit words,
  * low word first, otherwise as one. `code` outside [0, 2^31) or unknown gives -1000. */

@@ -64,8 +64,9 @@ void draw(const word_source& source, std::size_t n, std::size_t words_per_value,
           const Producer& producer) {
   const bool streaming = n > streaming_bytes / sizeof(Value);
   const std::size_t words = n * words_per_value;
-  const int threads =
-      source.engine->parallel && words >= parallel_words ? tarn_serv_get_max_threads() : 1;
+  // The user may have asked for all threads wherever there is more than one piece.
+  const std::size_t enough = tarn_serv_get_dynamic() != 0 ? parallel_words : piece_words + 1;
+  const int threads = source.engine->parallel && words >= enough ? tarn_serv_get_max_threads() : 1;
   if (threads == 1) {
     producer(source, n, out, streaming);
     return;

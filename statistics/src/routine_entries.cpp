@@ -11,11 +11,15 @@ namespace {
 
 using namespace tarn::statistics;
 
+// Routines with a single method take the code as it is.
+constexpr int any_method = 0x7FFFFFFF;
+
 // The common head of every routine: checks method, stream, count and results in this order and
-// runs use(stream) if there is something to do. `flags` are the bits that the method may have.
+// runs use(stream) if there is something to do. `flags` are the bits that the method may have; a
+// negative method is always refused.
 template <class Use>
 int routine(int method, int flags, void* stream, int n, const void* r, const Use& use) {
-  if ((method & ~flags) != 0)
+  if (method < 0 || (method & ~flags) != 0)
     return -1;
   live_stream found;
   if (const int status = find_stream(stream, found); status != RVX_STATUS_OK)
@@ -51,7 +55,7 @@ int uniform(int method, void* stream, int n, Real* r, Real a, Real b) {
 
 template <class Value>
 int words(int method, void* stream, int n, Value* r, bool equidistributed) {
-  return routine(method, 0, stream, n, r, [&](const live_stream& s) {
+  return routine(method, any_method, stream, n, r, [&](const live_stream& s) {
     if (equidistributed && !s.engine->uniform_bits)
       return RVX_STATUS_UNSUPPORTED;
     using producer = raw_words<Value>;
@@ -72,7 +76,7 @@ int _rvxdRngUniform(int method, void* stream, int n, double* r, double a, double
 
 int _rvxiRngUniform(int method, void* stream, int n, std::int32_t* r, std::int32_t a,
                     std::int32_t b) {
-  return routine(method, 0, stream, n, r, [&](const live_stream& s) {
+  return routine(method, any_method, stream, n, r, [&](const live_stream& s) {
     if (a >= b)
       return -5;
     draw(source_of(s), static_cast<std::size_t>(n), 1, r, uniform_int32{a, b});
