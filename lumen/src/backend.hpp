@@ -40,7 +40,7 @@ class backend_driver {
   virtual void synchronise(const device_record& device) = 0;
 };
 
-// One function a backend; the list of them is in device_list.cpp.
+// One function a backend; the list of them is in device.cpp.
 std::unique_ptr<backend_driver> make_host_driver();
 
 }  // namespace detail

@@ -113,12 +113,14 @@ buffer_handle::buffer_handle(std::shared_ptr<buffer_core> shared_core)
     : core(std::move(shared_core)) {}
 
 buffer_handle::~buffer_handle() {
+  // In the closure of a task: later users of the buffer may come after that very task.
+  task::pass_on_early();
   wait_for_others(conflicts_of(*core, true));
   core->write_back();
 }
 
 void require_access(handler& group, buffer_core& core, bool writes) {
-  handler_access::group(group).accesses.push_back({&core, writes});
+  handler_access::group(group).accesses.push_back({core.shared_from_this(), writes});
 }
 
 std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core, bool writes) {

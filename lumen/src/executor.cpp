@@ -7,6 +7,7 @@
 #include <chrono>
 #include <cstdlib>
 #include <ctime>
+#include <system_error>
 #include <unistd.h>
 
 #include <sys/prctl.h>
@@ -47,7 +48,11 @@ void executor::start_threads() {
   process_ = getpid();
   threads_.reserve(thread_count_);
   for (unsigned i = 0; i < thread_count_; ++i) {
-    threads_.emplace_back([this] { work(); });
+    try {
+      threads_.emplace_back([this] { work(); });
+    } catch (const std::system_error&) {
+      return;  // at a limit of the system: fewer workers are slower, not wrong
+    }
   }
 }
 
@@ -109,7 +114,7 @@ void executor::finished() {
 shared_loop* executor::joinable_loop() const {
   for (shared_loop* loop : loops_) {
     if (loop->next.load(std::memory_order_relaxed) < loop->total &&
-        loop->helpers + 1 < std::max(thread_count_, 2U)) {
+        loop->helpers + 1 < loop->threads) {
       return loop;
     }
   }
@@ -120,8 +125,8 @@ void executor::run(shared_loop& loop) {
   const std::size_t chunks = (loop.total + loop.grain - 1) / loop.grain;
   // The first of many chunks runs before anybody is woken: a short loop then costs no wake-up.
   const auto begin = std::chrono::steady_clock::now();
-  bool alone = thread_count_ < 2 || chunks < 2;
-  if (!alone && chunks >= 4 * thread_count_ && loop.run_chunk()) {
+  bool alone = loop.threads < 2 || chunks < 2;
+  if (!alone && chunks >= std::size_t{4} * loop.threads && loop.run_chunk()) {
     const auto chunk_time = std::chrono::steady_clock::now() - begin;
     alone = chunk_time * (chunks - 1) < std::chrono::microseconds(20);
   }
@@ -213,13 +218,14 @@ void executor::stop() {
   std::unique_lock<std::mutex> lock(mutex_);
   stopping_ = true;
   // What is ready runs to its end, and what becomes ready by that. What hangs on a host
-  // accessor that nobody will release is left.
+  // accessor that nobody will release is left, and so are the tasks that called exit.
+  const unsigned mine = task::depth_of_this_thread();
   for (;;) {
     if (first_ready_ != nullptr) {
       task& next = *first_ready_;
       unlink(next);
       run_claimed(next, lock);
-    } else if (running_ > (is_worker ? 1U : 0U) && process_ == getpid()) {
+    } else if (running_ > mine && process_ == getpid()) {
       milestones_.wait(lock);
     } else {
       break;

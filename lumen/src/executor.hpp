@@ -2,7 +2,8 @@
 // The threads that run tasks and share out the items of kernels. A submission wakes nobody while
 // there is a sentinel: a worker that naps in short steps as long as there is activity and takes
 // tasks that have lain ready for a whole nap, so that whoever waits at once runs them first.
-// After 20 ms without a submission the sentinel sleeps deeply too.
+// After 20 ms without a submission the sentinel sleeps deeply too. A child made by fork has no
+// workers: there, waiting threads run the tasks.
 #pragma once
 
 #include <atomic>
@@ -26,12 +27,17 @@ struct shared_loop {
   void* context;
   std::size_t total;
   std::size_t grain;  // units of a chunk, at least 1
+  unsigned threads;   // that may work on it at one time, at least 1
   std::atomic<std::size_t> next{0};
   unsigned helpers = 0;  // guarded by the executor
 
   shared_loop(void (*loop_body)(void*, std::size_t, std::size_t), void* loop_context,
-              std::size_t loop_total, std::size_t loop_grain)
-      : body(loop_body), context(loop_context), total(loop_total), grain(loop_grain) {}
+              std::size_t loop_total, std::size_t loop_grain, unsigned loop_threads)
+      : body(loop_body),
+        context(loop_context),
+        total(loop_total),
+        grain(loop_grain),
+        threads(loop_threads) {}
 
   // Runs one chunk; false when none is left.
   bool run_chunk();
@@ -48,7 +54,7 @@ class executor {
   void submit(task& ready);
   // Takes a ready task for the calling thread; false when it is not ready (any more).
   bool claim(task& wanted);
-  // Runs the loop on the calling thread and as many workers as are free.
+  // Runs the loop on the calling thread and as many workers as are free and the loop admits.
   void run(shared_loop& loop);
   // A claimed task was run to its end.
   void finished();

@@ -2,6 +2,7 @@
 // Command groups: checks of launches, memory commands, and the step from group to task.
 #include "sycl/detail/handler.hpp"
 
+#include <algorithm>
 #include <climits>
 #include <cstring>
 #include <string>
@@ -110,6 +111,10 @@ void handler::launch(const detail::launch_shape& shape,
   if (work->needs_groups()) {
     check_groups(shape, limits.max_work_group_size);
   }
+  if (group_.local_bytes != 0 && !work->needs_groups()) {
+    throw exception(make_error_code(errc::kernel_argument),
+                    "a local accessor needs a kernel over an nd_range");
+  }
   if (group_.local_bytes > limits.local_mem_size) {
     throw exception(make_error_code(errc::memory_allocation),
                     "the local accessors need " + std::to_string(group_.local_bytes) +
@@ -168,17 +173,16 @@ void handler::mem_advise(void* pointer, std::size_t bytes, int advice) {
 event handler::finish() {
   detail::queue_core& core = *group_.queue;
   const std::vector<detail::task_ref> dependencies = std::move(group_.dependencies);
-  const std::vector<detail::access_request> accesses = std::move(group_.accesses);
   auto* task = new detail::task(core.shared_from_this(), std::move(group_));
   event result = detail::event_access::make(detail::share(*task));
   for (const detail::task_ref& dependency : dependencies) {
     task->depend_on(*dependency.get());
   }
-  if (accesses.empty()) {
+  if (task->accesses().empty()) {
     core.add(*task);
   } else {
     const std::lock_guard<std::mutex> lock(detail::access_record::order_mutex());
-    for (const detail::access_request& access : accesses) {
+    for (const detail::access_request& access : task->accesses()) {
       access.core->record().add(*task, access.writes);
     }
     core.add(*task);
@@ -197,7 +201,9 @@ void reduction_launcher::launch(handler& group, const launch_shape& shape,
 std::size_t reserve_local(handler& group, std::size_t bytes, std::size_t alignment) {
   std::size_t& used = handler_access::group(group).local_bytes;
   const std::size_t place = (used + alignment - 1) / alignment * alignment;
-  used = place + bytes;
+  // More than any device has, and no sum of the two wraps around: the launch refuses it.
+  constexpr std::size_t too_much = static_cast<std::size_t>(-1) / 4;
+  used = std::min(place, too_much) + std::min(bytes, too_much);
   return place;
 }
 }  // namespace detail

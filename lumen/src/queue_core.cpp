@@ -72,7 +72,7 @@ void queue_core::wait() {
   }
 }
 
-void queue_core::report(std::exception_ptr error) {
+void queue_core::report(std::exception_ptr error) noexcept {
   std::vector<std::exception_ptr> late;
   {
     const std::lock_guard<std::mutex> lock(mutex_);

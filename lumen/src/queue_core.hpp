@@ -25,7 +25,8 @@ class queue_core : public std::enable_shared_from_this<queue_core> {
   void remove(task& finished);
   void wait();
 
-  void report(std::exception_ptr error);
+  // A handler that throws here has nobody to throw to: that ends the process.
+  void report(std::exception_ptr error) noexcept;
   void throw_asynchronous();
   // The user let the last handle go: what is unreported goes to the handler now, and what
   // fails later at once.

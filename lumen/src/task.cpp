@@ -16,8 +16,9 @@ namespace detail {
 namespace {
 // The tasks that this thread is inside of, innermost first.
 struct running_frame {
-  const task* running;
+  task* running;
   running_frame* outer;
+  bool closing;  // its work is over, its closure is being destroyed
 };
 thread_local running_frame* innermost = nullptr;
 // A waiter looks this many times before it goes to sleep: about two microseconds.
@@ -43,7 +44,8 @@ task::task(std::shared_ptr<queue_core> queue, command_group&& group)
     : queue_(std::move(queue)),
       kind_(group.kind),
       shape_(group.shape),
-      work_(std::move(group.work)) {}
+      work_(std::move(group.work)),
+      accesses_(std::move(group.accesses)) {}
 
 task::~task() = default;
 
@@ -53,7 +55,7 @@ void task::depend_on(task& other) {
   }
   {
     const std::lock_guard<std::mutex> lock(other.mutex_);
-    if (other.done()) {
+    if (other.executed_) {
       return;
     }
     unmet_.fetch_add(1, std::memory_order_relaxed);
@@ -64,6 +66,10 @@ void task::depend_on(task& other) {
 }
 
 void task::finish_linking() {
+  // Who sleeps on this task already has seen too few dependencies to help with.
+  if ((word_.fetch_or(linked_bit, std::memory_order_acq_rel) & waited_bit) != 0) {
+    futex_wake_all(word_);
+  }
   dependency_done();
 }
 
@@ -95,54 +101,59 @@ bool task::runs_on_this_thread() const noexcept {
   return false;
 }
 
-// A ready task that this one cannot start without, if the first open path leads to one.
-task_ref task::ready_ancestor() {
-  task_ref here = share(*this);
-  for (;;) {
-    task_ref next;
-    for (const task_ref& candidate : here->dependencies()) {
-      const task_state its = candidate->state();
-      if (its == task_state::ready) {
-        return candidate;
-      }
-      if (its == task_state::pending && !next) {
-        next = candidate;
-      }
+unsigned task::depth_of_this_thread() noexcept {
+  unsigned depth = 0;
+  for (const running_frame* frame = innermost; frame != nullptr; frame = frame->outer) {
+    ++depth;
+  }
+  return depth;
+}
+
+// A task that this one cannot start without, preferably one that can be helped.
+task_ref task::open_dependency() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  task_ref found;
+  for (const task_ref& candidate : dependencies_) {
+    const task_state its = candidate->state();
+    if (its == task_state::ready) {
+      return candidate;
     }
-    if (!next) {
-      return {};
+    if (its == task_state::pending || (its == task_state::running && !found)) {
+      found = candidate;
     }
-    here = next;
+  }
+  return found;
+}
+
+// Returns when the word is no longer the given one; may return for no reason.
+void task::sleep_while(std::uint32_t word) noexcept {
+  if ((word & waited_bit) != 0 ||
+      word_.compare_exchange_strong(word, word | waited_bit, std::memory_order_acq_rel)) {
+    futex_wait(word_, word | waited_bit);
   }
 }
 
 void task::wait() {
   executor& threads = executor::instance();
+  // Each task of the path holds up the one before it, the first this one. Whoever sleeps does it
+  // on the last: when that is done there may be nobody else to run what becomes ready.
+  std::vector<task_ref> path;
   for (int spins = 0; !done();) {
-    const task_state seen = state();
-    if (seen == task_state::ready && threads.claim(*this)) {
-      run();
-      return;
-    }
-    if (seen == task_state::pending) {
-      if (const task_ref ancestor = ready_ancestor()) {
-        if (threads.claim(*ancestor.get())) {
-          ancestor->run();
-        }
-        continue;
+    task& last = path.empty() ? *this : *path.back().get();
+    const std::uint32_t word = last.word_.load(std::memory_order_acquire);
+    const auto its = static_cast<task_state>(word & state_mask);
+    if (its == task_state::done) {
+      path.pop_back();
+    } else if (its == task_state::ready) {
+      if (threads.claim(last)) {
+        last.run();
       }
-    }
-    if (++spins < spins_before_sleep) {
+    } else if (task_ref next = its == task_state::pending ? last.open_dependency() : task_ref()) {
+      path.push_back(std::move(next));
+    } else if (++spins < spins_before_sleep) {
       relax();
-      continue;
-    }
-    std::uint32_t word = word_.load(std::memory_order_acquire);
-    const auto now = static_cast<task_state>(word & state_mask);
-    if (now == task_state::pending || now == task_state::running) {
-      if ((word & waited_bit) != 0 ||
-          word_.compare_exchange_strong(word, word | waited_bit, std::memory_order_acq_rel)) {
-        futex_wait(word_, word | waited_bit);
-      }
+    } else {
+      last.sleep_while(word);
     }
   }
 }
@@ -158,9 +169,32 @@ void task::execute() {
   }
 }
 
+void task::pass_on(task_state reached) {
+  std::vector<task_ref> successors;
+  std::vector<task_ref> dependencies;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    executed_ = true;
+    successors.swap(successors_);
+    dependencies.swap(dependencies_);
+    if (reached == task_state::done) {
+      set_state(task_state::done);
+    }
+  }
+  for (const task_ref& successor : successors) {
+    successor->dependency_done();
+  }
+}
+
+void task::pass_on_early() {
+  if (innermost != nullptr && innermost->closing) {
+    innermost->running->pass_on(task_state::running);
+  }
+}
+
 void task::run() {
   const task_ref self = share(*this);
-  running_frame frame{this, innermost};
+  running_frame frame{this, innermost, false};
   innermost = &frame;
   if (queue_ && queue_->profiling) {
     start_time.store(now_nanoseconds(), std::memory_order_relaxed);
@@ -171,32 +205,21 @@ void task::run() {
   } catch (...) {
     error = std::current_exception();
   }
-  try {
-    work_.reset();  // before done: what the closure holds is gone when a waiter returns
-  } catch (...) {
-    error = std::current_exception();
-  }
   if (queue_ && queue_->profiling) {
     end_time.store(now_nanoseconds(), std::memory_order_relaxed);
   }
-  innermost = frame.outer;
   if (error && queue_) {
     queue_->report(std::move(error));
   }
-  std::vector<task_ref> successors;
-  std::vector<task_ref> dependencies;
+  // Before done: what the closure holds is gone when a waiter returns.
+  frame.closing = true;
+  work_.reset();
+  accesses_.clear();
+  innermost = frame.outer;
   if (queue_) {
     queue_->remove(*this);
   }
-  {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    successors.swap(successors_);
-    dependencies.swap(dependencies_);
-    set_state(task_state::done);
-  }
-  for (const task_ref& successor : successors) {
-    successor->dependency_done();
-  }
+  pass_on(task_state::done);
   executor::instance().finished();
   release();  // the count that kept the task alive while it was unfinished
 }

@@ -48,9 +48,16 @@ class task {
   void run();
   // True while the calling thread is inside run() of this task.
   bool runs_on_this_thread() const noexcept;
+  // How many tasks the calling thread is inside of.
+  static unsigned depth_of_this_thread() noexcept;
+  // When the calling thread is letting go of a closure: what comes after that task may start
+  // now, so that the destructor of something in the closure can wait for it.
+  static void pass_on_early();
 
   std::vector<task_ref> dependencies();
   const std::shared_ptr<queue_core>& queue() const noexcept { return queue_; }
+  // To be read until finish_linking.
+  const std::vector<access_request>& accesses() const noexcept { return accesses_; }
 
   // Nanoseconds; 0 where the queue does not profile.
   std::atomic<std::uint64_t> submit_time{0};
@@ -69,14 +76,18 @@ class task {
   friend class executor;
   static constexpr std::uint32_t state_mask = 3;
   static constexpr std::uint32_t waited_bit = 4;
+  static constexpr std::uint32_t linked_bit = 8;
 
   void execute();
   void dependency_done();
   void set_state(task_state next) noexcept;
-  task_ref ready_ancestor();
+  void pass_on(task_state reached);
+  task_ref open_dependency();
+  void sleep_while(std::uint32_t word) noexcept;
 
   std::atomic<std::uint32_t> references_{1};
-  // The state in the low bits, plus whether somebody sleeps on this word.
+  // The state in the low bits, plus whether somebody sleeps on this word and whether all
+  // dependencies of a pending task are known.
   std::atomic<std::uint32_t> word_{0};
   // Unfinished dependencies, plus one while linking.
   std::atomic<std::uint32_t> unmet_{1};
@@ -84,7 +95,9 @@ class task {
   work_kind kind_;
   launch_shape shape_;
   std::unique_ptr<command> work_;
-  std::mutex mutex_;  // guards the two lists and the step to done
+  std::vector<access_request> accesses_;  // keep the memory of buffers
+  std::mutex mutex_;                      // guards the two lists and the steps to executed and done
+  bool executed_ = false;                 // nothing needs to wait for this task any more
   std::vector<task_ref> dependencies_;
   std::vector<task_ref> successors_;
 };

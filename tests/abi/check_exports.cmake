@@ -1,6 +1,7 @@
 # SPDX-License-Identifier: Apache-2.0
-# Fails if LIBRARY exports a name that does not match the regular expression MEANT, or none:
-#   cmake -DNM=nm -DLIBRARY=<file> -DMEANT=<regex> -P check_exports.cmake
+# Fails if LIBRARY exports a name that does not match the regular expression MEANT, or none, or if
+# a text of the list NEEDED stands in no readable name, or one of the list HIDDEN does:
+#   cmake -DNM=nm -DLIBRARY=<file> -DMEANT=<regex> [-DNEEDED=...] [-DHIDDEN=...] -P check_exports.cmake
 # Names are compared as they stand in the symbol table: the readable name of a template function
 # begins with its return type and would hide whose function it is.
 cmake_minimum_required(VERSION 3.25)
@@ -25,4 +26,18 @@ if(stray)
 elseif(count EQUAL 0)
   message(FATAL_ERROR "${LIBRARY} exports nothing")
 endif()
+execute_process(COMMAND "${NM}" -D --defined-only -C "${LIBRARY}"
+                OUTPUT_VARIABLE readable COMMAND_ERROR_IS_FATAL ANY)
+foreach(name IN LISTS NEEDED)
+  string(FIND "${readable}" "${name}" at)
+  if(at EQUAL -1)
+    message(FATAL_ERROR "${LIBRARY} does not export ${name}")
+  endif()
+endforeach()
+foreach(name IN LISTS HIDDEN)
+  string(FIND "${readable}" "${name}" at)
+  if(NOT at EQUAL -1)
+    message(FATAL_ERROR "${LIBRARY} exports ${name}, which is its own affair")
+  endif()
+endforeach()
 message(STATUS "${count} exported names, all meant")

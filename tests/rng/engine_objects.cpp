@@ -5,6 +5,7 @@
 #include <fstream>
 #include <initializer_list>
 #include <string>
+#include <tarn_rvx.h>
 #include <type_traits>
 #include <utility>
 #include <vector>
@@ -155,6 +156,13 @@ inline constexpr bool
     leaps<Engine, std::void_t<decltype(rng::leapfrog(std::declval<Engine&>(), std::uint64_t{},
                                                      std::uint64_t{}))>> = true;
 
+TEST(engine_type_properties, are_those_of_a_value) {
+  static_assert(std::is_nothrow_move_constructible_v<engine_type>);
+  static_assert(std::is_nothrow_move_assignable_v<engine_type>);
+  static_assert(std::is_copy_constructible_v<engine_type>);
+  static_assert(!std::is_polymorphic_v<engine_type>);
+}
+
 TEST(services, exist_as_the_rows_say) {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
                     uniform_bits, built)                                                     \
@@ -227,6 +235,18 @@ TEST(gpu_level, makes_moves_and_draws) {
   gpu::generate<engine_type, rng::bits<>>(queue, bits, listed, 8, values, {}).wait();
   EXPECT_EQ(words(values, values + 8), model_words(philox_model(1, 2, 3), 0, 8));
   gpu::delete_engine(queue, listed);
+
+  rvx_stream stream = nullptr;
+  ASSERT_EQ(rvxNewStream(&stream, RVX_BRNG_PHILOX4X32X10, 9), 0);
+  auto* wrapped = gpu::create_engine<engine_type>(stream);  // a copy: the stream stays its owner's
+  EXPECT_EQ(rvxDeleteStream(&stream), 0);
+  std::vector<std::uint32_t> buffered(8);
+  {
+    sycl::buffer<std::uint32_t, 1> buffer(buffered.data(), sycl::range<1>(8));
+    gpu::generate<engine_type, rng::bits<>>(queue, bits, wrapped, 8, buffer, {}).wait();
+  }
+  EXPECT_EQ(buffered, model_words(philox_model(9, 0), 0, 8));
+  gpu::delete_engine(queue, wrapped);
   sycl::free(values, queue);
 }
 

@@ -186,7 +186,16 @@ TEST(frame_on_a_gpu, a_range_past_the_limit_raises_the_runtimes_error_and_writes
                   [&] { rng::generate(rng::uniform<float>(), engine, n, &value); }),
               limit);
   }
+  // Two results for each work-item.
+  rng::philox4x32x10 pairs(tarn_test::gpu_queue(), 21);
+  std::uint64_t pair = 6;
+  EXPECT_EQ(message_of<sycl::exception>([&] {
+              rng::generate(rng::uniform_bits<std::uint64_t>(), pairs,
+                            2 * ((std::int64_t{1} << 31) - 1) + 1, &pair);
+            }),
+            limit);
   EXPECT_EQ(value, 6.0f);
+  EXPECT_EQ(pair, 6u);
   // The stream had moved before the launch failed, and it stays moved.
   rng::philox4x32x10 moved(tarn_test::gpu_queue(), 21);
   rng::skip_ahead(moved, static_cast<std::uint64_t>(first_refused));

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <limits>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include <kestrel/tarn/rng.hpp>
@@ -82,11 +83,16 @@ TEST_P(philox_road, counters_next_to_their_carries) {
 }
 
 TEST(philox_on_a_cpu, carries_in_mid_block_are_those_of_the_sequence) {
-  for (const int exponent : {32, 64, 96}) {
+  for (const uint128 carry : {uint128{1} << 32, uint128{1} << 64, uint128{1} << 96, uint128{0}}) {
+    const uint128 ctr = carry - 2;  // 0 stands for 2^128
     for (std::uint64_t first = 1; first < 16; ++first) {
-      const uint128 ctr = (uint128{1} << exponent) - 2;
-      auto engine = engine_at(tarn_test::cpu_queue(), ctr, first);
-      ASSERT_EQ(draw(rng::bits<>(), engine, 30), model_words(ctr, first, 30));
+      for (std::int64_t cut = 0; cut <= 30; cut += 3) {
+        auto engine = engine_at(tarn_test::cpu_queue(), ctr, first);
+        words drawn = draw(rng::bits<>(), engine, cut);
+        const words rest = draw(rng::bits<>(), engine, 30 - cut);
+        drawn.insert(drawn.end(), rest.begin(), rest.end());
+        ASSERT_EQ(drawn, model_words(ctr, first, 30)) << "cut at " << cut;
+      }
     }
   }
 }
@@ -103,6 +109,21 @@ TEST(philox_on_a_gpu, mid_block_start_before_a_multiple_of_2_to_32_reads_another
     const words other = model_words(ctr + (uint128{1} << 64), first, 4 - first);
     std::copy(other.begin(), other.end(), expected.begin());
     EXPECT_EQ(drawn, expected) << "from word " << first;
+  }
+}
+
+// The same before a multiple of 2^64: there both low words become all ones and the upper ones stay.
+TEST(philox_on_a_gpu, mid_block_start_before_a_multiple_of_2_to_64_reads_another_block) {
+  for (const uint128 ctr : {(uint128{1} << 64) - 1, (uint128{5} << 64) - 1, ~uint128{0}}) {
+    const uint128 other_ctr = ((ctr + 1) >> 64 << 64) + ~std::uint64_t{0};
+    for (std::uint64_t first = 1; first < 4; ++first) {
+      auto engine = engine_at(tarn_test::gpu_queue(), ctr, first);
+      const words drawn = draw(rng::bits<>(), engine, 12);
+      words expected = model_words(ctr, first, 12);
+      const words other = model_words(other_ctr, first, 4 - first);
+      std::copy(other.begin(), other.end(), expected.begin());
+      EXPECT_EQ(drawn, expected) << "from word " << first;
+    }
   }
 }
 
@@ -247,6 +268,29 @@ TEST(roads, part_for_negative_accurate_integers) {
   }
 }
 
+// Engines share nothing, so threads may each use their own, from the first use of the library on.
+TEST(roads, threads_with_engines_of_their_own_do_not_disturb_each_other) {
+  constexpr std::int64_t n = 5000;
+  std::vector<std::thread> threads;
+  std::array<words, 8> drawn;
+  for (std::size_t t = 0; t < drawn.size(); ++t) {
+    threads.emplace_back([&drawn, t] {
+      const sycl::queue queue = t % 2 == 0 ? tarn_test::cpu_queue() : tarn_test::gpu_queue();
+      auto engine = engine_at(queue, 100 * t, 1);
+      for (int call = 0; call < 10; ++call) {
+        const words more = draw(rng::bits<>(), engine, n / 10);
+        drawn[t].insert(drawn[t].end(), more.begin(), more.end());
+      }
+    });
+  }
+  for (std::thread& thread : threads) {
+    thread.join();
+  }
+  for (std::size_t t = 0; t < drawn.size(); ++t) {
+    EXPECT_EQ(drawn[t], model_words(100 * t, 1, n)) << "thread " << t;
+  }
+}
+
 // Integers on the host pass through doubles in half of the output above 2048 results; around that
 // size, and from memory that is not aligned for doubles, the values are those of a plain loop.
 TEST(philox_on_a_cpu, integers_in_place_equal_a_plain_loop) {
@@ -264,6 +308,14 @@ TEST(philox_on_a_cpu, integers_in_place_equal_a_plain_loop) {
       EXPECT_EQ(values.back(), 77);
       for (std::size_t i = 0; i < count; ++i) {
         ASSERT_EQ(values[shift + i], static_cast<std::int32_t>(reals[i])) << n << " at " << i;
+      }
+      // Unsigned integers are drawn the same way in both methods.
+      auto unsigned_engine = engine_at(queue, 0, 2);
+      auto unsigned_reals = engine_at(queue, 0, 2);
+      const auto wide = draw(rng::uniform<double>(5.0, 4294967295.0), unsigned_reals, n);
+      const auto numbers = draw(rng::uniform<std::uint32_t>(5u, 4294967295u), unsigned_engine, n);
+      for (std::size_t i = 0; i < count; ++i) {
+        ASSERT_EQ(numbers[i], static_cast<std::uint32_t>(wide[i])) << n << " at " << i;
       }
     }
   }

@@ -1,14 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 // Reports of generate at levels 0, 1 and 2. The program sets the level itself and reads the file
 // that TARN_VERBOSE_OUTPUT_FILE names in its environment.
-#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <condition_variable>
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
+#include <mutex>
 #include <regex>
 #include <sstream>
 #include <string>
 #include <tarn_serv.h>
+#include <thread>
 #include <vector>
 
 #include <kestrel/tarn/rng.hpp>
@@ -98,6 +102,66 @@ TEST_F(report, level_2_measures_host_and_device) {
   for (const std::string& line : lines()) {
     EXPECT_TRUE(std::regex_match(line, timed)) << line;
   }
+}
+
+/// A task on `queue` that ends when the gate is opened.
+class gate {
+ public:
+  explicit gate(sycl::queue queue)
+      : event(queue.submit([this](sycl::handler& group) {
+          group.host_task([this] {
+            std::unique_lock<std::mutex> lock(mutex_);
+            opened_.wait(lock, [this] { return open_; });
+          });
+        })) {}
+  void open() {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    open_ = true;
+    opened_.notify_all();
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable opened_;
+  bool open_ = false;
+
+ public:
+  sycl::event event;
+};
+
+TEST_F(report, level_1_waits_for_nothing) {
+  set_level(1);
+  rng::philox4x32x10 engine(tarn_test::gpu_queue());
+  auto* value = sycl::malloc_shared<float>(1, engine.get_queue());
+  *value = -1.0f;
+  gate closed(engine.get_queue());
+  sycl::event event = rng::generate(rng::uniform<float>(), engine, 1, value, {closed.event});
+  EXPECT_EQ(*value, -1.0f);
+  EXPECT_EQ(lines().size(), 1u);
+  closed.open();
+  event.wait();
+  EXPECT_NE(*value, -1.0f);
+  sycl::free(value, engine.get_queue());
+}
+
+TEST_F(report, level_2_waits_for_dependencies_before_it_starts) {
+  set_level(2);
+  rng::philox4x32x10 engine(profiled(tarn_test::gpu_queue()), 3);
+  auto* values = sycl::malloc_shared<float>(4, engine.get_queue());
+  gate closed(engine.get_queue());
+  std::atomic<bool> returned{false};
+  std::thread caller([&] {
+    rng::generate(rng::uniform<float>(), engine, 4, values, {closed.event});
+    returned = true;
+  });
+  // Long enough for a call that does not wait; one that waits cannot return, however long it is.
+  std::this_thread::sleep_for(std::chrono::milliseconds(50));
+  EXPECT_FALSE(returned);
+  EXPECT_TRUE(lines().empty());
+  closed.open();
+  caller.join();
+  EXPECT_EQ(lines().size(), 1u);
+  sycl::free(values, engine.get_queue());
 }
 
 TEST_F(report, a_refused_call_prints_nothing_and_leaves_no_depth_behind) {

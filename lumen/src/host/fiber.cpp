@@ -3,6 +3,7 @@
 // touched pages cost memory.
 #include "fiber.hpp"
 
+#include <cxxabi.h>
 #include <new>
 #include <unistd.h>
 
@@ -40,6 +41,10 @@ std::size_t page_bytes() {
   return bytes;
 }
 
+exceptions_in_flight& exceptions_of_this_thread() {
+  return *reinterpret_cast<exceptions_in_flight*>(abi::__cxa_get_globals());
+}
+
 // First thing on arrival: remember where the other side can be resumed.
 void arrive(switch_point& self, const context::transfer_t& from) {
   auto& origin = *static_cast<switch_point*>(from.data);
@@ -54,6 +59,9 @@ void arrive(switch_point& self, const context::transfer_t& from) {
 
 void switch_to(switch_point& from, switch_point& to) noexcept {
   from.target = &to;
+  exceptions_in_flight& exceptions = exceptions_of_this_thread();
+  from.exceptions = exceptions;
+  exceptions = to.exceptions;
 #if LUMEN_ASAN
   __sanitizer_start_switch_fiber(&from.fake_stack, to.stack_bottom, to.stack_size);
 #endif

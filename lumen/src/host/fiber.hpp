@@ -10,12 +10,20 @@
 LUMEN_NAMESPACE_BEGIN
 namespace detail {
 
+// What the C++ runtime keeps for each thread about exceptions that are thrown or being handled
+// (Itanium C++ ABI, section 2.2.2). A fiber may leave in the middle of a catch block.
+struct exceptions_in_flight {
+  void* caught = nullptr;
+  unsigned uncaught_count = 0;
+};
+
 // A place to come back to: a fiber that is not running, or the thread's own stack.
 class fiber;
 struct switch_point {
   void* context = nullptr;
   fiber* owner = nullptr;          // null for a thread's own stack
   switch_point* target = nullptr;  // where the last switch from here went
+  exceptions_in_flight exceptions;
   // For the sanitizers only.
   void* fake_stack = nullptr;
   const void* stack_bottom = nullptr;

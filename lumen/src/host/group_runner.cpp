@@ -29,8 +29,17 @@ void group_wait(group_frame& frame) {
 }
 
 group_runner& group_runner::of_this_thread() {
-  static thread_local group_runner runner;
-  return runner;
+  // A plain pointer, because tasks may still run on a thread whose objects are destroyed: the
+  // main thread finishes at exit what is left. The runner made then stays.
+  static thread_local group_runner* runner = nullptr;
+  struct release {
+    ~release() { delete std::exchange(runner, nullptr); }
+  };
+  if (runner == nullptr) {
+    runner = new group_runner;
+    static thread_local const release at_thread_end;
+  }
+  return *runner;
 }
 
 group_runner::group_runner() : local_memory_(nullptr, &std::free) {}

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The backend of the host CPU and of the virtual devices, which share its memory and threads.
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <exception>
@@ -89,7 +90,8 @@ class host_driver final : public backend_driver {
   void prefetch(const device_record&, void*, std::size_t) override {}
   void advise(const device_record&, void*, std::size_t, int) override {}
 
-  void launch(const device_record&, const launch_shape& shape, kernel_command& kernel) override {
+  void launch(const device_record& device, const launch_shape& shape,
+              kernel_command& kernel) override {
     if (shape.total() == 0) {
       return;
     }
@@ -99,10 +101,12 @@ class host_driver final : public backend_driver {
     if (groups) {
       units /= shape.local_range[0] * shape.local_range[1] * shape.local_range[2];
     }
+    // A virtual device has no more threads than compute units.
+    const unsigned used = std::min(threads.thread_count(), device.properties.max_compute_units);
     // Enough chunks to balance uneven ones, few enough that taking one costs nothing.
-    const std::size_t grain = units / (threads.thread_count() * std::size_t{16}) + 1;
+    const std::size_t grain = units / (used * std::size_t{16}) + 1;
     launch_state state{kernel, shape, nullptr, {}, nullptr};
-    shared_loop loop(groups ? &run_groups : &run_items, &state, units, grain);
+    shared_loop loop(groups ? &run_groups : &run_items, &state, units, grain, used);
     state.loop = &loop;
     threads.run(loop);
     if (state.error) {

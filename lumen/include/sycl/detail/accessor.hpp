@@ -108,7 +108,6 @@ class accessor : public detail::window<detail::element_for<DataT, Mode>, Dimensi
   SYCL_EXTERNAL std::add_pointer_t<element_type> get_pointer() const noexcept {
     return this->memory_start();
   }
-  SYCL_EXTERNAL element_type* begin_address() const { return this->memory_start(); }
 
   friend bool operator==(const accessor& a, const accessor& b) {
     return a.core_ == b.core_ && a.first_ == b.first_ && a.range_ == b.range_;

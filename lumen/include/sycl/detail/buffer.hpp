@@ -231,7 +231,8 @@ class buffer {
   }
   void set_write_back(bool flag = true) { core().enable_write_back(flag); }
 
-  // The same bytes as another type and shape; errc::invalid when the sizes differ.
+  // The same bytes as another type and shape; errc::invalid when the sizes differ or a sub-buffer
+  // does not begin at a multiple of the new element's size.
   template <typename ReinterpretT, int ReinterpretDim,
             typename ReinterpretAllocator = typename std::allocator_traits<
                 AllocatorT>::template rebind_alloc<std::remove_const_t<ReinterpretT>>>
@@ -239,6 +240,9 @@ class buffer {
       range<ReinterpretDim> sizes) const {
     if (sizes.size() * sizeof(ReinterpretT) != byte_size()) {
       detail::throw_invalid("reinterpret: the byte size of the new shape differs");
+    }
+    if (first_ * sizeof(T) % sizeof(ReinterpretT) != 0) {
+      detail::throw_invalid("reinterpret: the sub-buffer begins inside an element of the new type");
     }
     return buffer<ReinterpretT, ReinterpretDim, ReinterpretAllocator>(
         handle_, sizes, properties_, first_ * sizeof(T) / sizeof(ReinterpretT), sub_);
@@ -288,6 +292,10 @@ class buffer {
         sub_(sub) {}
 
   void make(T* place, const AllocatorT& allocator) {
+    if (detail::byte_count(range_, sizeof(T)) == static_cast<std::size_t>(-1)) {
+      throw exception(make_error_code(errc::memory_allocation),
+                      "the bytes of the buffer cannot be counted");
+    }
     handle_ = std::make_shared<detail::buffer_handle>(
         std::make_shared<core_type>(range_.size(), place, allocator));
   }

@@ -7,6 +7,7 @@
 #include <memory>
 
 #include "config.hpp"
+#include "range.hpp"
 
 LUMEN_NAMESPACE_BEGIN
 
@@ -15,7 +16,7 @@ class handler;
 namespace detail {
 class access_record;
 
-class LUMEN_EXPORT buffer_core {
+class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core> {
  public:
   explicit buffer_core(std::size_t bytes);
   buffer_core(const buffer_core&) = delete;
@@ -71,7 +72,8 @@ class buffer_allocator {
   template <typename U>
   buffer_allocator(const buffer_allocator<U>&) noexcept {}
   T* allocate(std::size_t count) {
-    return static_cast<T*>(detail::allocate_buffer(count * sizeof(T)));
+    return static_cast<T*>(
+        detail::allocate_buffer(detail::byte_count(range<1>(count), sizeof(T))));
   }
   void deallocate(T* data, std::size_t) noexcept { detail::free_buffer(data); }
   friend bool operator==(const buffer_allocator&, const buffer_allocator&) { return true; }

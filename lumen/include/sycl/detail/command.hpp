@@ -7,6 +7,7 @@
 #include <type_traits>
 #include <utility>
 
+#include "device_copyable.hpp"
 #include "group_frame.hpp"
 #include "item.hpp"
 #include "nd_item.hpp"
@@ -46,6 +47,14 @@ inline launch_shape shape_of(const nd_range<Dimensions>& ranges) {
     shape.local_range[d] = ranges.get_local_range()[d];
   }
   return shape;
+}
+
+// Kernels carry bytes only: closures that own something (strings, containers, buffers, queues)
+// do not go to a device. Types declared device copyable may say otherwise of themselves.
+template <typename Function>
+constexpr void check_kernel_type() {
+  static_assert(is_device_copyable_v<Function> || std::is_trivially_destructible_v<Function>,
+                "what a kernel captures must be device copyable");
 }
 
 class LUMEN_EXPORT command {

@@ -17,8 +17,9 @@ namespace detail {
 class buffer_core;
 class queue_core;
 
+// The task keeps the memory, even of a buffer that dies inside its command group function.
 struct access_request {
-  buffer_core* core;
+  std::shared_ptr<buffer_core> core;
   bool writes;
 };
 

@@ -43,7 +43,7 @@ LUMEN_EXPORT const std::error_category& sycl_category() noexcept;
 LUMEN_EXPORT std::error_code make_error_code(errc code) noexcept;
 
 // What every failing call throws. Copies share the text.
-class LUMEN_EXPORT exception : public std::exception {
+class LUMEN_EXPORT exception : public virtual std::exception {
  public:
   exception(std::error_code code, const std::string& what_arg);
   exception(std::error_code code, const char* what_arg);

@@ -63,24 +63,24 @@ class LUMEN_EXPORT handler {
   // Nothing is passed by position here: lambdas and functors carry their own arguments.
   template <typename KernelName = void, typename Function>
   void single_task(const Function& function) {
+    detail::check_kernel_type<Function>();
     launch(detail::shape_of(range<1>(1), id<1>()),
            std::make_unique<detail::single_kernel<Function>>(function));
   }
 
   // Throws errc::runtime when the range or an offset exceeds a signed 32-bit integer.
-  template <typename KernelName = void, int Dimensions, typename... Rest>
-  void parallel_for(range<Dimensions> sizes, const Rest&... rest) {
-    if constexpr (sizeof...(Rest) == 1) {
-      (launch_range(sizes, id<Dimensions>(), rest), ...);
-    } else if constexpr (std::is_same_v<std::decay_t<detail::first_of<Rest...>>, id<Dimensions>>) {
-      launch_range(sizes, rest...);
-    } else {
-      detail::launch_reduction(*this, sizes, rest...);
-    }
+  // The range may also be given as a number or in braces.
+  template <typename KernelName = void, typename... Rest>
+  void parallel_for(range<1> sizes, const Rest&... rest) {
+    launch_sizes(sizes, rest...);
   }
   template <typename KernelName = void, typename... Rest>
-  void parallel_for(std::size_t size, const Rest&... rest) {
-    parallel_for<KernelName>(range<1>(size), rest...);
+  void parallel_for(range<2> sizes, const Rest&... rest) {
+    launch_sizes(sizes, rest...);
+  }
+  template <typename KernelName = void, typename... Rest>
+  void parallel_for(range<3> sizes, const Rest&... rest) {
+    launch_sizes(sizes, rest...);
   }
   // Throws errc::nd_range unless the groups divide the range and fit the device.
   template <typename KernelName = void, int Dimensions, typename... Rest>
@@ -156,13 +156,25 @@ class LUMEN_EXPORT handler {
   friend struct detail::handler_access;
   explicit handler(detail::queue_core& core);
 
+  template <int Dimensions, typename... Rest>
+  void launch_sizes(const range<Dimensions>& sizes, const Rest&... rest) {
+    if constexpr (sizeof...(Rest) == 1) {
+      (launch_range(sizes, id<Dimensions>(), rest), ...);
+    } else if constexpr (std::is_same_v<std::decay_t<detail::first_of<Rest...>>, id<Dimensions>>) {
+      launch_range(sizes, rest...);
+    } else {
+      detail::launch_reduction(*this, sizes, rest...);
+    }
+  }
   template <int Dimensions, typename Function>
   void launch_range(range<Dimensions> sizes, id<Dimensions> offset, const Function& function) {
+    detail::check_kernel_type<Function>();
     launch(detail::shape_of(sizes, offset),
            std::make_unique<detail::range_kernel<Dimensions, Function>>(sizes, offset, function));
   }
   template <int Dimensions, typename Function>
   void launch_groups(const nd_range<Dimensions>& ranges, const Function& function) {
+    detail::check_kernel_type<Function>();
     launch(detail::shape_of(ranges),
            std::make_unique<detail::nd_range_kernel<Dimensions, Function>>(function));
   }

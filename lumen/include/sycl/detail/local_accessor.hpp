@@ -37,7 +37,7 @@ class local_accessor {
   local_accessor() = default;
   local_accessor(range<Dimensions> sizes, handler& group, const property_list& = {})
       : range_(sizes),
-        place_(detail::reserve_local(group, sizes.size() * sizeof(DataT), alignof(DataT))) {}
+        place_(detail::reserve_local(group, detail::byte_count(sizes, sizeof(DataT)), alignof(DataT))) {}
 
   SYCL_EXTERNAL size_type size() const noexcept { return range_.size(); }
   SYCL_EXTERNAL size_type max_size() const noexcept { return size_type(-1) / sizeof(DataT); }
@@ -66,16 +66,16 @@ class local_accessor {
   SYCL_EXTERNAL iterator end() const noexcept { return begin_address() + size(); }
   SYCL_EXTERNAL const_iterator cbegin() const noexcept { return begin_address(); }
   SYCL_EXTERNAL const_iterator cend() const noexcept { return begin_address() + size(); }
-  SYCL_EXTERNAL DataT* begin_address() const {
-    return reinterpret_cast<DataT*>(detail::local_memory_base + place_);
-  }
-
   friend bool operator==(const local_accessor& a, const local_accessor& b) {
     return a.place_ == b.place_ && a.range_ == b.range_;
   }
   friend bool operator!=(const local_accessor& a, const local_accessor& b) { return !(a == b); }
 
  private:
+  SYCL_EXTERNAL DataT* begin_address() const {
+    return reinterpret_cast<DataT*>(detail::local_memory_base + place_);
+  }
+
   range<Dimensions> range_;
   std::size_t place_ = 0;
 };

@@ -45,7 +45,7 @@ class multi_ptr {
             typename = typename Accessor::reference,
             typename = std::enable_if_t<!std::is_same_v<std::remove_cv_t<Accessor>, multi_ptr> &&
                                         detail::space_converts<Accessor::pointer_space, Space>>>
-  SYCL_EXTERNAL explicit multi_ptr(const Accessor& source) : pointer_(source.begin_address()) {}
+  SYCL_EXTERNAL explicit multi_ptr(const Accessor& source) : pointer_(source.get_pointer()) {}
   // To more const, to another decoration, from a named space to the generic one.
   template <typename Other, access::address_space OtherSpace, access::decorated OtherDecorated,
             typename = std::enable_if_t<

@@ -263,6 +263,22 @@ SYCL_EXTERNAL inline id<Dimensions> index_of(std::size_t linear, const range<Dim
   index[0] = linear;
   return index;
 }
+
+// Bytes of that many elements; the largest number where they cannot be counted.
+template <int Dimensions>
+inline std::size_t byte_count(const range<Dimensions>& sizes, std::size_t element_bytes) {
+  constexpr auto most = static_cast<std::size_t>(-1);
+  std::size_t bytes = element_bytes;
+  bool fits = true;
+  for (int d = 0; d < Dimensions; ++d) {
+    if (sizes[d] == 0) {
+      return 0;
+    }
+    fits = fits && bytes <= most / sizes[d];
+    bytes *= sizes[d];
+  }
+  return fits ? bytes : most;
+}
 }  // namespace detail
 
 LUMEN_NAMESPACE_END

@@ -234,6 +234,7 @@ template <typename Ranges, typename... Rest>
 void launch_reduction(handler& group, const Ranges& ranges, const Rest&... rest) {
   const auto all = std::tie(rest...);
   constexpr std::size_t last = sizeof...(Rest) - 1;
+  check_kernel_type<std::decay_t<decltype(std::get<last>(all))>>();
   const auto make = [&](auto... numbers) {
     return reduction_work(ranges, std::get<last>(all), std::get<numbers>(all)...);
   };
