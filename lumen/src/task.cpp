@@ -55,7 +55,7 @@ void task::depend_on(task& other) {
   }
   {
     const std::lock_guard<std::mutex> lock(other.mutex_);
-    if (other.executed_) {
+    if (other.has_passed()) {
       return;
     }
     unmet_.fetch_add(1, std::memory_order_relaxed);
@@ -67,9 +67,7 @@ void task::depend_on(task& other) {
 
 void task::finish_linking() {
   // Who sleeps on this task already has seen too few dependencies to help with.
-  if ((word_.fetch_or(linked_bit, std::memory_order_acq_rel) & waited_bit) != 0) {
-    futex_wake_all(word_);
-  }
+  set_bit(linked_bit);
   dependency_done();
 }
 
@@ -90,6 +88,16 @@ void task::set_state(task_state next) noexcept {
   if ((before & waited_bit) != 0) {
     futex_wake_all(word_);
   }
+}
+
+void task::set_bit(std::uint32_t bit) noexcept {
+  if ((word_.fetch_or(bit, std::memory_order_acq_rel) & waited_bit) != 0) {
+    futex_wake_all(word_);
+  }
+}
+
+bool task::has_passed() const noexcept {
+  return done() || (word_.load(std::memory_order_acquire) & passed_bit) != 0;
 }
 
 bool task::runs_on_this_thread() const noexcept {
@@ -118,7 +126,7 @@ task_ref task::open_dependency() {
     if (its == task_state::ready) {
       return candidate;
     }
-    if (its == task_state::pending || (its == task_state::running && !found)) {
+    if (its == task_state::pending || (!candidate->has_passed() && !found)) {
       found = candidate;
     }
   }
@@ -142,7 +150,7 @@ void task::wait() {
     task& last = path.empty() ? *this : *path.back().get();
     const std::uint32_t word = last.word_.load(std::memory_order_acquire);
     const auto its = static_cast<task_state>(word & state_mask);
-    if (its == task_state::done) {
+    if (!path.empty() && last.has_passed()) {
       path.pop_back();
     } else if (its == task_state::ready) {
       if (threads.claim(last)) {
@@ -174,11 +182,12 @@ void task::pass_on(task_state reached) {
   std::vector<task_ref> dependencies;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    executed_ = true;
     successors.swap(successors_);
     dependencies.swap(dependencies_);
     if (reached == task_state::done) {
       set_state(task_state::done);
+    } else {
+      set_bit(passed_bit);
     }
   }
   for (const task_ref& successor : successors) {

@@ -77,17 +77,21 @@ class task {
   static constexpr std::uint32_t state_mask = 3;
   static constexpr std::uint32_t waited_bit = 4;
   static constexpr std::uint32_t linked_bit = 8;
+  static constexpr std::uint32_t passed_bit = 16;
 
   void execute();
   void dependency_done();
   void set_state(task_state next) noexcept;
+  void set_bit(std::uint32_t bit) noexcept;
+  bool has_passed() const noexcept;
   void pass_on(task_state reached);
   task_ref open_dependency();
   void sleep_while(std::uint32_t word) noexcept;
 
   std::atomic<std::uint32_t> references_{1};
-  // The state in the low bits, plus whether somebody sleeps on this word and whether all
-  // dependencies of a pending task are known.
+  // The state in the low bits, plus whether somebody sleeps on this word, whether all
+  // dependencies of a pending task are known, and whether nothing depends on a running task
+  // any more.
   std::atomic<std::uint32_t> word_{0};
   // Unfinished dependencies, plus one while linking.
   std::atomic<std::uint32_t> unmet_{1};
@@ -96,8 +100,7 @@ class task {
   launch_shape shape_;
   std::unique_ptr<command> work_;
   std::vector<access_request> accesses_;  // keep the memory of buffers
-  std::mutex mutex_;                      // guards the two lists and the steps to executed and done
-  bool executed_ = false;                 // nothing needs to wait for this task any more
+  std::mutex mutex_;                      // guards the two lists and the step to passed or done
   std::vector<task_ref> dependencies_;
   std::vector<task_ref> successors_;
 };

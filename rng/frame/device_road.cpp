@@ -18,10 +18,4 @@ sycl::event submit_with_snapshot(sycl::queue& queue, const std::vector<sycl::eve
   });
 }
 
-std::size_t work_items(std::int64_t n, std::int32_t per_item) {
-  const auto sum = static_cast<std::int64_t>(static_cast<std::uint64_t>(n) +
-                                             static_cast<std::uint64_t>(per_item - 1));
-  return static_cast<std::size_t>(sum / per_item);
-}
-
 }  // namespace kestrel::tarn::rng::detail

@@ -7,7 +7,9 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <initializer_list>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 #include <kestrel/tarn/rng/device_level.hpp>
@@ -37,7 +39,11 @@ sycl::event submit_with_snapshot(sycl::queue& queue, const std::vector<sycl::eve
 
 /// The number of work-items for `n` results of `per_item` each, in signed arithmetic: a sum past
 /// 2^63 turns negative, which the runtime's test of the range refuses like any range over 2^31.
-std::size_t work_items(std::int64_t n, std::int32_t per_item);
+inline std::size_t work_items(std::int64_t n, std::int32_t per_item) {
+  const auto sum = static_cast<std::int64_t>(static_cast<std::uint64_t>(n) +
+                                             static_cast<std::uint64_t>(per_item - 1));
+  return static_cast<std::size_t>(sum / per_item);
+}
 
 /// What a kernel stores through: the pointer itself, or an accessor bound in the command group.
 /// Elements past `n` keep their values.

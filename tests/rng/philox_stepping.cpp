@@ -5,10 +5,12 @@
 #include <cmath>
 #include <cstdint>
 #include <cstring>
+#include <limits>
 
 #include <gtest/gtest.h>
 
 #include "engines/philox4x32x10.hpp"
+#include "frame/device_road.hpp"
 #include "models/philox_model.hpp"
 
 namespace {
@@ -145,6 +147,18 @@ TEST(philox_stepping, reals_are_one_multiply_add_of_the_signed_word) {
     EXPECT_EQ(floats[i], std::fma(static_cast<float>(word), 0x1p-32f, 0.5f));
     EXPECT_EQ(doubles[i], std::fma(static_cast<double>(word), 0x1p-30, -2.0));
   }
+}
+
+TEST(launch, has_one_work_item_for_each_started_block) {
+  using detail::work_items;
+  EXPECT_EQ(work_items(0, 4), 0u);
+  EXPECT_EQ(work_items(1, 4), 1u);
+  EXPECT_EQ(work_items(4, 4), 1u);
+  EXPECT_EQ(work_items(5, 4), 2u);
+  EXPECT_EQ(work_items(3, 2), 2u);
+  EXPECT_EQ(work_items(4 * std::int64_t{0x7FFFFFFF}, 4), 0x7FFFFFFFu);
+  // A count next to 2^63 does not wrap to a small range: it stays above every limit.
+  EXPECT_GT(work_items(std::numeric_limits<std::int64_t>::max(), 4), 0x7FFFFFFFu);
 }
 
 TEST(philox_rule, scale_and_offset_of_the_unit_interval_are_exact) {
