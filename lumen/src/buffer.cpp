@@ -78,6 +78,28 @@ void wait_for_others(const std::vector<task_ref>& tasks) {
   }
 }
 
+// The buffer dies with the closure of a task: its other users may have to wait for that task, so
+// nobody waits for them here.
+class late_write_back final : public host_command {
+ public:
+  explicit late_write_back(std::shared_ptr<buffer_core> core) : core_(std::move(core)) {}
+  void run(const interop_handle&) override { core_->write_back(); }
+
+ private:
+  std::shared_ptr<buffer_core> core_;
+};
+void write_back_after(const std::vector<task_ref>& users,
+                      const std::shared_ptr<buffer_core>& core) {
+  command_group group;
+  group.kind = work_kind::host;
+  group.work = std::make_unique<late_write_back>(core);
+  auto* last = new task(nullptr, std::move(group));  // keeps itself alive until it is done
+  for (const task_ref& user : users) {
+    last->depend_on(*user.get());
+  }
+  last->finish_linking();
+}
+
 // One host accessor: stands in the buffer's record as a task that is done when this goes.
 class host_hold {
  public:
@@ -113,9 +135,18 @@ buffer_handle::buffer_handle(std::shared_ptr<buffer_core> shared_core)
     : core(std::move(shared_core)) {}
 
 buffer_handle::~buffer_handle() {
-  // In the closure of a task: later users of the buffer may come after that very task.
-  task::pass_on_early();
-  wait_for_others(conflicts_of(*core, true));
+  std::vector<task_ref> users = conflicts_of(*core, true);
+  if (const task* closing = task::closing_on_this_thread()) {
+    users.erase(
+        std::remove_if(users.begin(), users.end(),
+                       [=](const task_ref& user) { return user.get() == closing || user->done(); }),
+        users.end());
+    if (!users.empty()) {
+      write_back_after(users, core);
+      return;
+    }
+  }
+  wait_for_others(users);
   core->write_back();
 }
 

@@ -30,7 +30,7 @@ struct virtual_device_parse {
 };
 
 // kind[,setting=number]... joined by ';'. Kinds: gpu, accelerator. Settings: compute_units
-// (1 to 65536), max_work_group_size (1 to 4096).
+// (1 to 65536; no kernel of the device has more threads), max_work_group_size (1 to 4096).
 virtual_device_parse parse_virtual_devices(const std::string& text);
 std::vector<virtual_device_setting> virtual_devices_from_environment();
 

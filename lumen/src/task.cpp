@@ -16,7 +16,7 @@ namespace detail {
 namespace {
 // The tasks that this thread is inside of, innermost first.
 struct running_frame {
-  task* running;
+  const task* running;
   running_frame* outer;
   bool closing;  // its work is over, its closure is being destroyed
 };
@@ -55,7 +55,7 @@ void task::depend_on(task& other) {
   }
   {
     const std::lock_guard<std::mutex> lock(other.mutex_);
-    if (other.has_passed()) {
+    if (other.done()) {
       return;
     }
     unmet_.fetch_add(1, std::memory_order_relaxed);
@@ -67,7 +67,9 @@ void task::depend_on(task& other) {
 
 void task::finish_linking() {
   // Who sleeps on this task already has seen too few dependencies to help with.
-  set_bit(linked_bit);
+  if ((word_.fetch_or(linked_bit, std::memory_order_acq_rel) & waited_bit) != 0) {
+    futex_wake_all(word_);
+  }
   dependency_done();
 }
 
@@ -90,16 +92,6 @@ void task::set_state(task_state next) noexcept {
   }
 }
 
-void task::set_bit(std::uint32_t bit) noexcept {
-  if ((word_.fetch_or(bit, std::memory_order_acq_rel) & waited_bit) != 0) {
-    futex_wake_all(word_);
-  }
-}
-
-bool task::has_passed() const noexcept {
-  return done() || (word_.load(std::memory_order_acquire) & passed_bit) != 0;
-}
-
 bool task::runs_on_this_thread() const noexcept {
   for (const running_frame* frame = innermost; frame != nullptr; frame = frame->outer) {
     if (frame->running == this) {
@@ -117,6 +109,10 @@ unsigned task::depth_of_this_thread() noexcept {
   return depth;
 }
 
+const task* task::closing_on_this_thread() noexcept {
+  return innermost != nullptr && innermost->closing ? innermost->running : nullptr;
+}
+
 // A task that this one cannot start without, preferably one that can be helped.
 task_ref task::open_dependency() {
   const std::lock_guard<std::mutex> lock(mutex_);
@@ -126,7 +122,7 @@ task_ref task::open_dependency() {
     if (its == task_state::ready) {
       return candidate;
     }
-    if (its == task_state::pending || (!candidate->has_passed() && !found)) {
+    if (its == task_state::pending || (its == task_state::running && !found)) {
       found = candidate;
     }
   }
@@ -146,11 +142,14 @@ void task::wait() {
   // Each task of the path holds up the one before it, the first this one. Whoever sleeps does it
   // on the last: when that is done there may be nobody else to run what becomes ready.
   std::vector<task_ref> path;
-  for (int spins = 0; !done();) {
+  for (int spins = 0;;) {
     task& last = path.empty() ? *this : *path.back().get();
     const std::uint32_t word = last.word_.load(std::memory_order_acquire);
     const auto its = static_cast<task_state>(word & state_mask);
-    if (!path.empty() && last.has_passed()) {
+    if (its == task_state::done) {
+      if (path.empty()) {
+        return;
+      }
       path.pop_back();
     } else if (its == task_state::ready) {
       if (threads.claim(last)) {
@@ -174,30 +173,6 @@ void task::execute() {
     auto& kernel = static_cast<kernel_command&>(*work_);
     device.driver->launch(device, shape_, kernel);
     kernel.finish();
-  }
-}
-
-void task::pass_on(task_state reached) {
-  std::vector<task_ref> successors;
-  std::vector<task_ref> dependencies;
-  {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    successors.swap(successors_);
-    dependencies.swap(dependencies_);
-    if (reached == task_state::done) {
-      set_state(task_state::done);
-    } else {
-      set_bit(passed_bit);
-    }
-  }
-  for (const task_ref& successor : successors) {
-    successor->dependency_done();
-  }
-}
-
-void task::pass_on_early() {
-  if (innermost != nullptr && innermost->closing) {
-    innermost->running->pass_on(task_state::running);
   }
 }
 
@@ -228,7 +203,17 @@ void task::run() {
   if (queue_) {
     queue_->remove(*this);
   }
-  pass_on(task_state::done);
+  std::vector<task_ref> successors;
+  std::vector<task_ref> dependencies;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    successors.swap(successors_);
+    dependencies.swap(dependencies_);
+    set_state(task_state::done);
+  }
+  for (const task_ref& successor : successors) {
+    successor->dependency_done();
+  }
   executor::instance().finished();
   release();  // the count that kept the task alive while it was unfinished
 }

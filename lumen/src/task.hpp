@@ -50,9 +50,8 @@ class task {
   bool runs_on_this_thread() const noexcept;
   // How many tasks the calling thread is inside of.
   static unsigned depth_of_this_thread() noexcept;
-  // When the calling thread is letting go of a closure: what comes after that task may start
-  // now, so that the destructor of something in the closure can wait for it.
-  static void pass_on_early();
+  // The task whose work is over and whose closure the calling thread is destroying, or null.
+  static const task* closing_on_this_thread() noexcept;
 
   std::vector<task_ref> dependencies();
   const std::shared_ptr<queue_core>& queue() const noexcept { return queue_; }
@@ -77,21 +76,16 @@ class task {
   static constexpr std::uint32_t state_mask = 3;
   static constexpr std::uint32_t waited_bit = 4;
   static constexpr std::uint32_t linked_bit = 8;
-  static constexpr std::uint32_t passed_bit = 16;
 
   void execute();
   void dependency_done();
   void set_state(task_state next) noexcept;
-  void set_bit(std::uint32_t bit) noexcept;
-  bool has_passed() const noexcept;
-  void pass_on(task_state reached);
   task_ref open_dependency();
   void sleep_while(std::uint32_t word) noexcept;
 
   std::atomic<std::uint32_t> references_{1};
-  // The state in the low bits, plus whether somebody sleeps on this word, whether all
-  // dependencies of a pending task are known, and whether nothing depends on a running task
-  // any more.
+  // The state in the low bits, plus whether somebody sleeps on this word and whether all
+  // dependencies of a pending task are known.
   std::atomic<std::uint32_t> word_{0};
   // Unfinished dependencies, plus one while linking.
   std::atomic<std::uint32_t> unmet_{1};
@@ -100,7 +94,7 @@ class task {
   launch_shape shape_;
   std::unique_ptr<command> work_;
   std::vector<access_request> accesses_;  // keep the memory of buffers
-  std::mutex mutex_;                      // guards the two lists and the step to passed or done
+  std::mutex mutex_;                      // guards the two lists and the step to done
   std::vector<task_ref> dependencies_;
   std::vector<task_ref> successors_;
 };

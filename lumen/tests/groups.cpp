@@ -3,6 +3,8 @@
 // against serial loops, asynchronous copies.
 #include <atomic>
 #include <numeric>
+#include <stdexcept>
+#include <string>
 
 #include "every_device.hpp"
 
@@ -277,4 +279,37 @@ TEST_P(groups, asynchronous_copies_with_strides) {
     EXPECT_EQ(out[static_cast<std::size_t>(2 * i + 1)], -1);
   }
 }
+// The C++ runtime stacks caught exceptions by thread, but items leave in the middle of a handler.
+TEST_P(groups, items_may_wait_while_they_handle_an_exception) {
+  sycl::queue q(device());
+  std::vector<int> right(64);
+  int* out = right.data();
+  q.parallel_for(sycl::nd_range<1>(64, 64), [=](sycl::nd_item<1> i) {
+     const std::string text = "the text of work-item " + std::to_string(i.get_local_id(0));
+     try {
+       throw std::runtime_error(text);
+     } catch (const std::exception& error) {
+       sycl::group_barrier(i.get_group());
+       const bool mine = text == error.what();
+       try {
+         throw;
+       } catch (const std::exception& again) {
+         out[i.get_local_id(0)] = mine && text == again.what();
+       }
+     }
+   }).wait();
+  EXPECT_EQ(right, std::vector<int>(64, 1));
+}
+
+TEST_P(groups, local_memory_needs_groups) {
+  sycl::queue q(device());
+  EXPECT_EQ(code_of([&] {
+              q.submit([](sycl::handler& h) {
+                sycl::local_accessor<int> block(4, h);
+                h.parallel_for(sycl::range<1>(1), [=](sycl::id<1>) { (void)block; });
+              });
+            }),
+            sycl::errc::kernel_argument);
+}
+
 LUMEN_ON_EVERY_DEVICE(groups);

@@ -41,8 +41,8 @@ std::size_t page_bytes() {
   return bytes;
 }
 
-exceptions_in_flight& exceptions_of_this_thread() {
-  return *reinterpret_cast<exceptions_in_flight*>(abi::__cxa_get_globals());
+exceptions_in_flight* exceptions_of_this_thread() {
+  return reinterpret_cast<exceptions_in_flight*>(abi::__cxa_get_globals());
 }
 
 // First thing on arrival: remember where the other side can be resumed.
@@ -59,9 +59,8 @@ void arrive(switch_point& self, const context::transfer_t& from) {
 
 void switch_to(switch_point& from, switch_point& to) noexcept {
   from.target = &to;
-  exceptions_in_flight& exceptions = exceptions_of_this_thread();
-  from.exceptions = exceptions;
-  exceptions = to.exceptions;
+  from.exceptions = *from.thread_exceptions;
+  *from.thread_exceptions = to.exceptions;
 #if LUMEN_ASAN
   __sanitizer_start_switch_fiber(&from.fake_stack, to.stack_bottom, to.stack_size);
 #endif
@@ -72,10 +71,9 @@ void switch_to(switch_point& from, switch_point& to) noexcept {
 }
 
 void adopt_thread(switch_point& self) noexcept {
+  self.thread_exceptions = exceptions_of_this_thread();
 #if LUMEN_TSAN
   self.thread_fiber = __tsan_get_current_fiber();
-#else
-  (void)self;
 #endif
 }
 
@@ -101,6 +99,7 @@ fiber::fiber(void (*entry)(void*), void* argument, std::size_t colour)
   (void)mprotect(mapping_, guard, PROT_NONE);
   char* top = mapping_ + guard + stack_bytes - (colour % colours) * colour_step;
   point.owner = this;
+  point.thread_exceptions = exceptions_of_this_thread();
   point.context = context::make_fcontext(top, static_cast<std::size_t>(top - (mapping_ + guard)),
                                          &fiber_start::run);
   point.stack_bottom = mapping_ + guard;

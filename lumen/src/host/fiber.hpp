@@ -24,6 +24,7 @@ struct switch_point {
   fiber* owner = nullptr;          // null for a thread's own stack
   switch_point* target = nullptr;  // where the last switch from here went
   exceptions_in_flight exceptions;
+  exceptions_in_flight* thread_exceptions = nullptr;  // of the thread, which stays the same
   // For the sanitizers only.
   void* fake_stack = nullptr;
   const void* stack_bottom = nullptr;
@@ -39,8 +40,9 @@ void adopt_thread(switch_point& self) noexcept;
 
 class fiber {
  public:
-  // `entry` starts at the first switch to the fiber and never returns. The colour moves the top
-  // of the stack, so that many stacks do not share their cache sets.
+  // For the calling thread alone. `entry` starts at the first switch to the fiber and never
+  // returns. The colour moves the top of the stack, so that many stacks do not share their cache
+  // sets.
   fiber(void (*entry)(void*), void* argument, std::size_t colour);
   fiber(const fiber&) = delete;
   fiber& operator=(const fiber&) = delete;

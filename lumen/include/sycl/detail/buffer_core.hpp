@@ -39,7 +39,8 @@ class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core
 };
 
 // What the copies of one buffer share. The last of them waits for all tasks that use the
-// memory and then writes back.
+// memory and then writes back. Where it dies with the closure of a task nobody waits: the
+// contents go home after the last of the other tasks.
 class LUMEN_EXPORT buffer_handle {
  public:
   explicit buffer_handle(std::shared_ptr<buffer_core> shared_core);
@@ -72,8 +73,7 @@ class buffer_allocator {
   template <typename U>
   buffer_allocator(const buffer_allocator<U>&) noexcept {}
   T* allocate(std::size_t count) {
-    return static_cast<T*>(
-        detail::allocate_buffer(detail::byte_count(range<1>(count), sizeof(T))));
+    return static_cast<T*>(detail::allocate_buffer(detail::byte_count(range<1>(count), sizeof(T))));
   }
   void deallocate(T* data, std::size_t) noexcept { detail::free_buffer(data); }
   friend bool operator==(const buffer_allocator&, const buffer_allocator&) { return true; }

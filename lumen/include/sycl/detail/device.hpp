@@ -37,7 +37,7 @@ template <typename Selector>
 selector_view view_of(const Selector& selector) {
   if constexpr (std::is_function_v<Selector>) {
     return {reinterpret_cast<const void*>(&selector), [](const void* object, const device& d) {
-              return static_cast<int>(reinterpret_cast<const Selector*>(object)(d));
+              return static_cast<int>(reinterpret_cast<Selector*>(const_cast<void*>(object))(d));
             }};
   } else {
     return {std::addressof(selector), [](const void* object, const device& d) {

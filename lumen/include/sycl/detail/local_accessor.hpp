@@ -37,7 +37,8 @@ class local_accessor {
   local_accessor() = default;
   local_accessor(range<Dimensions> sizes, handler& group, const property_list& = {})
       : range_(sizes),
-        place_(detail::reserve_local(group, detail::byte_count(sizes, sizeof(DataT)), alignof(DataT))) {}
+        place_(detail::reserve_local(group, detail::byte_count(sizes, sizeof(DataT)),
+                                     alignof(DataT))) {}
 
   SYCL_EXTERNAL size_type size() const noexcept { return range_.size(); }
   SYCL_EXTERNAL size_type max_size() const noexcept { return size_type(-1) / sizeof(DataT); }
