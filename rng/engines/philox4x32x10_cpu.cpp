@@ -31,14 +31,10 @@ std::vector<std::uint32_t> words_of(std::initializer_list<std::uint64_t> list) {
 
 philox4x32x10::philox4x32x10(sycl::queue queue_, std::uint64_t seed)
     : engine_base(std::move(queue_)) {
-  impl = detail::require_impl(
-      detail::make_impl<engine>(
-          queue,
-          [&] {
-            return detail::make_cpu_backend<engine>([&] { return detail::new_stream(code, seed); });
-          },
-          [&] { return detail::gpu::create_engine<engine>(queue, seed); }),
-      queue);
+  impl = detail::require_impl(detail::make_impl<engine>(
+                                  queue, [&] { return detail::new_stream(code, seed); },
+                                  [&] { return detail::gpu::create_engine<engine>(queue, seed); }),
+                              queue);
 }
 
 // A list of n items travels as n words on a CPU queue, which are the first n of its 2n words, and
@@ -49,11 +45,7 @@ philox4x32x10::philox4x32x10(sycl::queue queue_, std::initializer_list<std::uint
   const auto items = static_cast<std::int64_t>(seed.size());
   impl = detail::require_impl(
       detail::make_impl<engine>(
-          queue,
-          [&] {
-            return detail::make_cpu_backend<engine>(
-                [&] { return detail::new_stream(code, items, words.data()); });
-          },
+          queue, [&] { return detail::new_stream(code, items, words.data()); },
           [&] { return detail::gpu::create_engine<engine>(queue, 2 * items, words.data()); }),
       queue);
 }

@@ -17,19 +17,13 @@ namespace kestrel::tarn::rng::detail {
 template <typename Engine>
 using owned_impl = std::unique_ptr<engine_base_impl<Engine>>;
 
-/// A backend of the host road around a stream that `make_stream` makes.
-template <typename Engine, typename MakeStream>
-owned_impl<Engine> make_cpu_backend(MakeStream make_stream) {
-  return std::make_unique<engine_base_impl_backend<Engine, device_type::cpu>>(make_stream());
-}
-
-/// The implementation for the queue's device, by the first of two factories on a CPU and by the
-/// second on a GPU; null on any other device or where the engine has no road.
-template <typename Engine, typename MakeCpu, typename MakeGpu>
-owned_impl<Engine> make_impl(sycl::queue& queue, MakeCpu make_cpu, MakeGpu make_gpu) {
+/// The implementation for the queue's device: on a CPU around the stream that `make_stream` makes,
+/// on a GPU what `make_gpu` creates. Null on any other device and where the engine has no road.
+template <typename Engine, typename MakeStream, typename MakeGpu>
+owned_impl<Engine> make_impl(sycl::queue& queue, MakeStream make_stream, MakeGpu make_gpu) {
   const sycl::device device = queue.get_device();
   if (device.is_cpu()) {
-    return make_cpu();
+    return std::make_unique<engine_base_impl_backend<Engine, device_type::cpu>>(make_stream());
   }
   if constexpr (engine_row<Engine>::gpu) {
     if (device.is_gpu()) {
@@ -42,11 +36,11 @@ owned_impl<Engine> make_impl(sycl::queue& queue, MakeCpu make_cpu, MakeGpu make_
 template <typename Engine>
 owned_impl<Engine> copy_impl(sycl::queue& queue, engine_base_impl<Engine>* source) {
   return make_impl<Engine>(
-      queue,
-      [&] { return make_cpu_backend<Engine>([&] { return copy_stream(source->stream.get()); }); },
+      queue, [&] { return copy_stream(source->stream.get()); },
       [&] { return gpu::create_engine<Engine>(queue, source); });
 }
 
+/// Raises unsupported_device for what could not be made.
 template <typename Engine>
 owned_impl<Engine> require_impl(owned_impl<Engine> impl, const sycl::queue& queue) {
   if (impl == nullptr) {
