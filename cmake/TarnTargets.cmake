@@ -56,9 +56,8 @@ function(tarn_shared_library target output export)
   add_library(tarn::${export} ALIAS ${target})
   set_target_properties(${target} PROPERTIES OUTPUT_NAME ${output} EXPORT_NAME ${export}
                         VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR})
-  target_link_options(${target} PRIVATE -Wl,--no-undefined -Wl,--as-needed)
-  if(TARN_SANITIZE)
-    set_property(TARGET ${target} PROPERTY LINK_OPTIONS "")
+  if(NOT TARN_SANITIZE)  # the sanitizers' own symbols come with the program
+    target_link_options(${target} PRIVATE -Wl,--no-undefined -Wl,--as-needed)
   endif()
   set(map "${CMAKE_CURRENT_SOURCE_DIR}/exports.map")
   if(EXISTS "${map}")

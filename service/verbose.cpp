@@ -112,13 +112,9 @@ void verbose_buffer_end(double* seconds, sycl::buffer<T, 1>& buffer) {
   *seconds += tarn_serv_dsecnd();
 }
 
-#define TARN_VERBOSE_BUFFER(type)                                      \
+#define TARN_RESULT_TYPE(type)                                         \
   template void verbose_buffer_start(double*, sycl::buffer<type, 1>&); \
   template void verbose_buffer_end(double*, sycl::buffer<type, 1>&);
-TARN_VERBOSE_BUFFER(float)
-TARN_VERBOSE_BUFFER(double)
-TARN_VERBOSE_BUFFER(std::int32_t)
-TARN_VERBOSE_BUFFER(std::uint32_t)
-TARN_VERBOSE_BUFFER(std::uint64_t)
+#include "result_types.def"
 
 }  // namespace kestrel::tarn::gpu

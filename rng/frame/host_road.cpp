@@ -30,13 +30,9 @@ sycl::event run_host_call(sycl::queue& queue, const host_call& call, sycl::buffe
   return event;
 }
 
-#define TARN_RUN_HOST_CALL(type)                                                             \
+#define TARN_RESULT_TYPE(type)                                                               \
   template sycl::event run_host_call(sycl::queue&, const host_call&, sycl::buffer<type, 1>&, \
                                      const std::vector<sycl::event>&);
-TARN_RUN_HOST_CALL(float)
-TARN_RUN_HOST_CALL(double)
-TARN_RUN_HOST_CALL(std::int32_t)
-TARN_RUN_HOST_CALL(std::uint32_t)
-TARN_RUN_HOST_CALL(std::uint64_t)
+#include "result_types.def"
 
 }  // namespace kestrel::tarn::rng::detail

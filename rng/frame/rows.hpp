@@ -34,12 +34,11 @@ enum class device_entry : std::uint8_t { generate, generate_ex };
 template <typename Distr>
 struct distribution_row;
 
-#define TARN_DISTRIBUTION(family_, result, method, type, words_, road, built) \
-  template <>                                                                 \
-  struct distribution_row<TARN_UNWRAP type> {                                 \
-    static constexpr const char* family = #family_;                           \
-    static constexpr std::uint64_t per_output_words = words_;                 \
-    static constexpr device_entry entry = device_entry::road;                 \
+#define TARN_DISTRIBUTION(family, result, method, type, words_, road, built) \
+  template <>                                                                \
+  struct distribution_row<TARN_UNWRAP type> {                                \
+    static constexpr std::uint64_t per_output_words = words_;                \
+    static constexpr device_entry entry = device_entry::road;                \
   };
 #include "distributions/distributions.def"
 

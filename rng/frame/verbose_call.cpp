@@ -112,12 +112,8 @@ void run_reported(const reported_call& call, sycl::buffer<T, 1>& r) {
   report(call.queue, description, event, seconds);
 }
 
-#define TARN_RUN_REPORTED(type) \
+#define TARN_RESULT_TYPE(type) \
   template void run_reported(const reported_call&, sycl::buffer<type, 1>&);
-TARN_RUN_REPORTED(float)
-TARN_RUN_REPORTED(double)
-TARN_RUN_REPORTED(std::int32_t)
-TARN_RUN_REPORTED(std::uint32_t)
-TARN_RUN_REPORTED(std::uint64_t)
+#include "result_types.def"
 
 }  // namespace kestrel::tarn::rng::detail
