@@ -99,7 +99,7 @@ void add_peers() {
 }
 
 void print_ratios(const ratio_reporter& r) {
-  std::printf("\nQuotients of the median rates (bytes per second)\n");
+  std::printf("\nQuotients of the median rates (values per second)\n");
   r.print_ratio("rvx/float", "random123/float", 2.0);
   r.print_ratio("rvx/float", "std_mt19937/float", 6.0);
   for (const char* peer : {"random123", "std_mt19937", "boost_mt19937"})

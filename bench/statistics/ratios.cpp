@@ -6,9 +6,13 @@
 
 void ratio_reporter::ReportRuns(const std::vector<Run>& runs) {
   for (const Run& run : runs) {
-    const auto rate = run.counters.find("bytes_per_second");
-    if (run.aggregate_name == "median" && rate != run.counters.end())
+    if (run.aggregate_name != "median")
+      continue;
+    const auto rate = run.counters.find("items_per_second");
+    if (rate != run.counters.end())
       rates_[run.run_name.function_name] = rate->second;
+    nanoseconds_[run.run_name.function_name] =
+        run.GetAdjustedRealTime() * 1e9 / benchmark::GetTimeUnitMultiplier(run.time_unit);
   }
   ConsoleReporter::ReportRuns(runs);
 }
@@ -16,6 +20,13 @@ void ratio_reporter::ReportRuns(const std::vector<Run>& runs) {
 double ratio_reporter::rate(const std::string& name) const {
   const auto found = rates_.find(name);
   return found == rates_.end() ? 0 : found->second;
+}
+
+void ratio_reporter::print_time(const std::string& of, double limit) const {
+  const auto found = nanoseconds_.find(of);
+  if (found != nanoseconds_.end())
+    std::printf("%-32s %12.1f ns   asked: below %.0f ns   %s\n", of.c_str(), found->second, limit,
+                found->second < limit ? "met" : "MISSED");
 }
 
 void ratio_reporter::print_ratio(const std::string& of, const std::string& to, double asked,

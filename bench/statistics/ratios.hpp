@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A console reporter that keeps the median rates and can print their quotients: times of one
+// A console reporter that keeps the medians and can print the quotients of rates: times of one
 // machine mean little to another, quotients of one run do.
 #pragma once
 
@@ -13,8 +13,11 @@ class ratio_reporter : public benchmark::ConsoleReporter {
  public:
   void ReportRuns(const std::vector<Run>& runs) override;
 
-  // Median rate of a benchmark (bytes per second), or 0 if it did not run.
+  // Median rate of a benchmark (values per second), or 0 if it did not run.
   double rate(const std::string& name) const;
+
+  // One line: the median time of one iteration and whether it is below `limit` (nanoseconds).
+  void print_time(const std::string& of, double limit) const;
 
   // One line: the quotient of two median rates, and whether it is what is asked for (0: nothing
   // is). Reaching the rate of `ceiling` will do as well.
@@ -22,5 +25,5 @@ class ratio_reporter : public benchmark::ConsoleReporter {
                    const std::string& ceiling = "") const;
 
  private:
-  std::map<std::string, double> rates_;
+  std::map<std::string, double> rates_, nanoseconds_;
 };

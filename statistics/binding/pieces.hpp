@@ -11,15 +11,15 @@ namespace tarn::rvx {
 
 inline constexpr std::int64_t largest_piece = 0x7FFFFFFF;
 
-// Calls generate(count, r) for successive pieces of n values until one fails or all are done; the
-// status of the last call is the result. 1 <= piece <= largest_piece.
+// Calls generate(count, r) for successive pieces of n results, each of `width` values, until one
+// fails or all are done; the status of the last call is the result. 1 <= piece <= largest_piece.
 template <class Value, class Generate>
-int in_pieces(std::int64_t n, Value* r, std::int64_t piece, const Generate& generate) {
+int in_pieces(std::int64_t n, Value* r, int width, std::int64_t piece, const Generate& generate) {
   int status = RVX_STATUS_OK;
   while (n > 0 && status == RVX_STATUS_OK) {
     const std::int64_t count = std::min(n, piece);
     status = generate(static_cast<int>(count), r);
-    r += count;
+    r += count * width;
     n -= count;
   }
   return status;

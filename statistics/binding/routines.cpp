@@ -2,22 +2,19 @@
 // The generation routines under their plain names. Every routine goes the same steps in the same
 // order; the parameters of a distribution and the bits of its method are checked only when there
 // is something to generate.
+#include <cstring>
 #include <limits>
 
 #include "checks.hpp"
 #include "entry.hpp"
 #include "pieces.hpp"
+#include "statistics/common/parameters.hpp"
 #include "tarn_rvx.h"
 
 namespace {
 
 using namespace tarn::rvx;
-
-// Bits that a method may have.
-constexpr std::int64_t accuracy_methods = RVX_RNG_METHOD_ACCURACY_FLAG;
-constexpr std::int64_t any_method = std::numeric_limits<int>::max();  // taken as it is
-
-constexpr int parameters_good = 0;
+namespace parameters = tarn::statistics::parameters;
 
 // A failure that the checks in front cannot foresee: the method's bits, or a stream that is not in
 // order. Callers may drop the status, so it has to be reported here; a missing entry has been.
@@ -27,11 +24,29 @@ int report_failure(const char* name, int status) {
   return report(name, status == -1 ? 1 : 2, status);
 }
 
-// `bad_parameter` gives the position of the first bad parameter of the distribution, or
-// parameters_good; `call(method, stream, n, r)` is the library's routine.
-template <class Value, class BadParameter, class Call>
-int routine(const char* name, std::int64_t method, std::int64_t method_bits, rvx_stream stream,
-            std::int64_t n, Value* r, const BadParameter& bad_parameter, const Call& call) {
+// Values that one raw word of the stream's engine takes: words of more than 32 bits take two.
+int values_per_word(rvx_stream stream) {
+  constexpr std::uint32_t member_mask = 0xFFFFF;
+  std::uint32_t code;
+  std::memcpy(&code, stream, sizeof code);
+  switch (code & ~member_mask) {
+#define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
+                    uniform_bits, built)                                                     \
+  case code:                                                                                 \
+    return word_bits > 32 ? 2 : 1;
+#include "rng/engines/engines.def"
+  }
+  return 1;
+}
+
+constexpr int one_value = 1;
+
+// The steps of a routine. `check()` gives the position of the first bad parameter of the
+// distribution, or 0; `width()` the values of one result; `call(method, stream, count, to)` is the
+// library's routine.
+template <class Value, class Check, class Width, class Call>
+int routine(const char* name, std::int64_t method, int methods, rvx_stream stream, std::int64_t n,
+            Value* r, const Check& check, const Width& width, const Call& call) {
   if (method < 0)
     return report(name, 1, -1);
   if (const int status = check_stream(name, 2, stream); status != 0)
@@ -42,67 +57,28 @@ int routine(const char* name, std::int64_t method, std::int64_t method_bits, rvx
     return RVX_STATUS_OK;
   if (r == nullptr)
     return report(name, 4, -4);
-  if (const int position = bad_parameter(); position != parameters_good)
+  if (const int position = check(); position != parameters::good)
     return report(name, position, -position);
-  if ((method & ~method_bits) != 0)
+  if ((method & ~std::int64_t{methods}) != 0)
     return report(name, 1, -1);
-  const int status = in_pieces(n, r, largest_piece, [&](int count, Value* to) {
+  const int status = in_pieces(n, r, width(), largest_piece, [&](int count, Value* to) {
     return call(static_cast<int>(method), stream, count, to);
   });
   return report_failure(name, status);
 }
 
-template <class Value>
-int uniform(const char* name, std::int64_t method, std::int64_t method_bits, rvx_stream stream,
-            std::int64_t n, Value* r, Value a, Value b,
-            entry<int(int, rvx_stream, int, Value*, Value, Value)>& library) {
-  return routine(
-      name, method, method_bits, stream, n, r,
-      // Also true for bounds that are not numbers.
-      [&] { return a < b ? parameters_good : 5; },
-      [&](int m, rvx_stream s, int count, Value* to) { return library(m, s, count, to, a, b); });
-}
-
-template <class Word>
-int words(const char* name, std::int64_t method, rvx_stream stream, std::int64_t n, Word* r,
-          entry<int(int, rvx_stream, int, Word*)>& library) {
-  return routine(
-      name, method, any_method, stream, n, r, [] { return parameters_good; },
-      [&](int m, rvx_stream s, int count, Word* to) { return library(m, s, count, to); });
-}
-
 }  // namespace
 
-int rvxsRngUniform(std::int64_t method, rvx_stream stream, std::int64_t n, float* r, float a,
-                   float b) {
-  static entry<int(int, rvx_stream, int, float*, float, float)> library("_rvxsRngUniform");
-  return uniform(__func__, method, accuracy_methods, stream, n, r, a, b, library);
-}
-
-int rvxdRngUniform(std::int64_t method, rvx_stream stream, std::int64_t n, double* r, double a,
-                   double b) {
-  static entry<int(int, rvx_stream, int, double*, double, double)> library("_rvxdRngUniform");
-  return uniform(__func__, method, accuracy_methods, stream, n, r, a, b, library);
-}
-
-int rvxiRngUniform(std::int64_t method, rvx_stream stream, std::int64_t n, std::int32_t* r,
-                   std::int32_t a, std::int32_t b) {
-  static entry<int(int, rvx_stream, int, std::int32_t*, std::int32_t, std::int32_t)> library(
-      "_rvxiRngUniform");
-  return uniform(__func__, method, any_method, stream, n, r, a, b, library);
-}
-
-int rvxiRngUniformBits(std::int64_t method, rvx_stream stream, std::int64_t n, std::uint32_t* r) {
-  static entry<int(int, rvx_stream, int, std::uint32_t*)> library("_rvxiRngUniformBits");
-  return words(__func__, method, stream, n, r, library);
-}
-
-int rvxiRngUniformBits32(std::int64_t method, rvx_stream stream, std::int64_t n, std::uint32_t* r) {
-  static entry<int(int, rvx_stream, int, std::uint32_t*)> library("_rvxiRngUniformBits32");
-  return words(__func__, method, stream, n, r, library);
-}
-
-int rvxiRngUniformBits64(std::int64_t method, rvx_stream stream, std::int64_t n, std::uint64_t* r) {
-  static entry<int(int, rvx_stream, int, std::uint64_t*)> library("_rvxiRngUniformBits64");
-  return words(__func__, method, stream, n, r, library);
-}
+#define TARN_UNWRAP(...) __VA_ARGS__
+#define TARN_ROUTINE(name, value, methods, width, parameters_, arguments, check)                   \
+  int rvx##name(std::int64_t method, rvx_stream stream, std::int64_t n,                            \
+                value* r TARN_UNWRAP parameters_) {                                                \
+    static entry<int(int, rvx_stream, int, value* TARN_UNWRAP parameters_)> library("_rvx" #name); \
+    return routine(                                                                                \
+        __func__, method, parameters::methods, stream, n, r, [&] { return parameters::check; },    \
+        [&] { return width; },                                                                     \
+        [&](int code, rvx_stream source, int count, value* to) {                                   \
+          return library(code, source, count, to TARN_UNWRAP arguments);                           \
+        });                                                                                        \
+  }
+#include "statistics/common/routines.def"

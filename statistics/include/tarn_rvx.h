@@ -12,8 +12,8 @@
  * number of threads, or on how a sequence is cut into calls.
  *
  * Environment: TARN_NUM_THREADS, the most threads that one call may use (large calls share their
- * work out); TARN_SIMD_TARGET, the instruction set of the kernels by its Highway name (AVX3, AVX2,
- * SSE4, SSSE3, SCALAR; default: best), for tests and comparisons.
+ * work out); TARN_SIMD_TARGET, the instruction set of the kernels by its Highway name (AVX3_DL,
+ * AVX3, AVX2, SSE4, SSSE3, SCALAR; default: best), for tests and comparisons.
  */
 #ifndef TARN_RVX_H
 #define TARN_RVX_H
@@ -35,8 +35,20 @@ extern "C" {
  * byte 4, the engine's state from byte 16 on. */
 typedef void* rvx_stream;
 
-/* Engine codes: the engine's number shifted left by 20. */
-#define RVX_BRNG_PHILOX4X32X10 0x1000000
+/* Engine codes: the engine's number shifted left by 20. The manual has a page for each engine. */
+#define RVX_BRNG_MCG31 0x100000          /* multiplicative congruential, modulus 2^31 - 1 */
+#define RVX_BRNG_R250 0x200000           /* feedback shift register, lags 103 and 250 */
+#define RVX_BRNG_MRG32K3A 0x300000       /* combined multiple recursive */
+#define RVX_BRNG_MCG59 0x400000          /* multiplicative congruential, modulus 2^59 */
+#define RVX_BRNG_WH 0x500000             /* Wichmann-Hill, a set: + 0 to 272 */
+#define RVX_BRNG_SOBOL 0x600000          /* quasi-random, up to 3667 dimensions */
+#define RVX_BRNG_NIEDERR 0x700000        /* quasi-random, up to 4720 dimensions */
+#define RVX_BRNG_MT19937 0x800000        /* Mersenne twister */
+#define RVX_BRNG_MT2203 0x900000         /* small Mersenne twisters, a set: + 0 to 6023 */
+#define RVX_BRNG_SFMT19937 0xD00000      /* SIMD-oriented fast Mersenne twister */
+#define RVX_BRNG_NONDETERM 0xE00000      /* the processor's or the operating system's source */
+#define RVX_BRNG_ARS5 0xF00000           /* counter-based, five AES rounds */
+#define RVX_BRNG_PHILOX4X32X10 0x1000000 /* counter-based, ten Philox rounds */
 
 /* Method codes. The accuracy flag keeps results of a uniform inside [a, b]. */
 #define RVX_RNG_METHOD_STANDARD 0
@@ -47,74 +59,111 @@ typedef void* rvx_stream;
 /* Statuses. Other negative values name a bad argument: -k is the k-th argument. */
 #define RVX_STATUS_OK 0
 #define RVX_STATUS_NULL_STREAM (-5)
-/* No engine of that code, or bad seed words. */
+/* No engine of that code, or seed words that no stream can be made of. */
 #define RVX_STATUS_BAD_CODE (-1000)
 #define RVX_STATUS_NO_MEMORY (-1001)
 /* The engine has no such service. */
 #define RVX_STATUS_UNSUPPORTED (-1002)
 /* The library lacks the entry, and an exit hook kept the process alive. */
 #define RVX_STATUS_NO_ENTRY (-1003)
+/* Neither the processor nor the operating system gives random words. */
+#define RVX_STATUS_NO_SOURCE (-1004)
+/* The call would go past the end of a finite sequence (2^32 - 1 points of a quasi-random one). */
+#define RVX_STATUS_END_OF_SEQUENCE (-1005)
 /* Not a stream, one that was deleted, or a state that its engine cannot be in. */
 #define RVX_STATUS_BAD_MARK (-1006)
 #define RVX_STATUS_FILE_OPEN (-1100)
 #define RVX_STATUS_FILE_READ (-1101)
 #define RVX_STATUS_FILE_WRITE (-1102)
-/* A damaged or foreign image: mark, version, length, checksum or an impossible field. */
+/* A damaged or foreign image: mark, version, length, check sum or an impossible field. */
 #define RVX_STATUS_BAD_IMAGE (-1103)
 
-/* New stream from a seed of up to 64 bits. A seed above 0x7FFFFFFF travels as two 32-bit words,
- * low word first, otherwise as one. `code` outside [0, 2^31) or unknown gives -1000. */
+/* ---- Streams ----------------------------------------------------------------------------------
+ * Besides the statuses named, every function that takes a stream gives -5 for a null one and -1006
+ * for one without its mark. */
+
+/* A new stream from a seed of up to 64 bits (a count of dimensions for the quasi-random engines).
+ * A seed above 0x7FFFFFFF travels as two 32-bit words, low word first, otherwise as one: engines
+ * of 32-bit seeds then take their array rule.
+ *   stream  receives the handle; not null (-5)
+ *   code    an engine code (-1000 for others)
+ * Also -1000 for a seed that the engine refuses, -1001, -1004. */
 RVX_API int rvxNewStream(rvx_stream* stream, int64_t code, uint64_t seed);
 
-/* New stream from `n` 32-bit seed words; how many words an engine uses is the engine's affair:
- * missing ones have the engine's default, further ones are ignored. */
+/* A new stream from seed words; how many of them an engine uses, and how, its manual page tells:
+ * missing ones have the engine's default, further ones are ignored.
+ *   n       count of words, 0 to 2^31 - 1 (-3)
+ *   params  n words; may be null if n is 0 (-4)
+ * Quasi-random engines: {dimensions}; or {dimensions, 1, 4} and 32 direction words for each
+ * dimension (RVX_BRNG_SOBOL), {count, 1, 1} and count irreducible polynomials, bit i the
+ * coefficient of t^i (RVX_BRNG_NIEDERR). */
 RVX_API int rvxNewStreamEx(rvx_stream* stream, int64_t code, int64_t n, const uint32_t* params);
 
 /* Frees the stream and clears the handle. */
 RVX_API int rvxDeleteStream(rvx_stream* stream);
 
-/* Deep copy into a new stream. */
+/* Deep copy of `in` into a new stream, which goes on by itself. -1001 without memory. */
 RVX_API int rvxCopyStream(rvx_stream* out, rvx_stream in);
 
-/* Moves the stream forward by `count` words. The 64 bits are read as an unsigned number. */
+/* Moves the stream forward by `count` words; the 64 bits are read as an unsigned number. -1002 for
+ * RVX_BRNG_R250, _MT2203 and _NONDETERM; -1005 past the end; -1001 without memory for the long
+ * jump of a Mersenne twister. On failure the stream has not moved. */
 RVX_API int rvxSkipAheadStream(rvx_stream stream, int64_t count);
 
-/* Moves forward by the number whose `n` 64-bit digits are `words`, least significant first. */
+/* Moves forward by the number whose `n` 64-bit digits are `words`, least significant first, modulo
+ * the period. RVX_BRNG_MRG32K3A, _ARS5 and _PHILOX4X32X10; -1002 for others.
+ *   n      0 to 2^31 - 1 (-2)
+ *   words  n digits (-3) */
 RVX_API int rvxSkipAheadStreamEx(rvx_stream stream, int64_t n, const uint64_t* words);
 
-/* Leaves every `stride`-th word, beginning with word `idx` (engines that can). */
+/* Leaves words idx, idx + stride, idx + 2 stride, ... of what the stream would have given.
+ * RVX_BRNG_MCG31, _MCG59 and _WH; -1002 for others.
+ *   idx     0 to stride - 1 (-2)
+ *   stride  1 to 2^31 - 1 (-3) */
 RVX_API int rvxLeapfrogStream(rvx_stream stream, int64_t idx, int64_t stride);
 
-/* Bytes of the saved image, positive; a negative status on failure. */
+/* Bytes of the saved image, positive. */
 RVX_API int rvxGetStreamSize(rvx_stream stream);
 
-/* Image in memory of rvxGetStreamSize bytes. Loading makes a new stream. */
+/* The image in memory of rvxGetStreamSize bytes (-2 if null). Loading makes a new stream, or none:
+ * -1103 for what is no whole image, -1001. */
 RVX_API int rvxSaveStreamM(rvx_stream stream, uint8_t* mem);
 RVX_API int rvxLoadStreamM(rvx_stream* stream, const uint8_t* mem);
 
-/* Image in a file. `length` is the length of the name, or -1 for a NUL-terminated one. A save
- * writes beside the file and renames, so that an older image survives an interrupted save. */
+/* The image in a file. A save writes beside the file and renames, so that an older image survives
+ * an interrupted save and a full disk.
+ *   name    not null (-2)
+ *   length  bytes of the name, or -1 for a NUL-terminated one (-3)
+ * -1100, -1101, -1102 when the file cannot be opened, read or written; -1103; -1001. */
 RVX_API int rvxSaveStreamF(rvx_stream stream, const char* name, int length);
 RVX_API int rvxLoadStreamF(rvx_stream* stream, const char* name, int length);
 
-/* Generation. Common head: method code, stream, number of results (0 or more), results; then
- * the distribution's parameters. */
+/* ---- Routines ---------------------------------------------------------------------------------
+ * Common head:
+ *   method  a method code, not negative (-1)
+ *   stream  (-5, -1006)
+ *   n       count of results, 0 or more (-3); 0 does nothing
+ *   r       n results (-4)
+ * then the distribution's parameters. Also -1002 where the engine does not offer the routine,
+ * -1005 past the end of a finite sequence, -1004 when an outer source fails, -1001. */
 
-/* Uniform on [a, b), a < b: the word-to-real rule of the engine, one word for one result. The
+/* Uniform on [a, b), a < b (-5): the word-to-real rule of the engine, one word for one result. The
  * values b - a and a + b are taken in the type of the results and must be finite. Rounding may
  * deliver b itself; with the accuracy flag no result lies outside [a, b]. */
 RVX_API int rvxsRngUniform(int64_t method, rvx_stream stream, int64_t n, float* r, float a,
                            float b);
 RVX_API int rvxdRngUniform(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
                            double b);
-/* Integers of [a, b): floor of a float uniform, so a range wider than 2^24 has gaps. */
+/* Integers of [a, b), a < b (-5): floor of a float uniform, so a range wider than 2^24 has gaps. */
 RVX_API int rvxiRngUniform(int64_t method, rvx_stream stream, int64_t n, int32_t* r, int32_t a,
                            int32_t b);
-/* The engine's raw words. */
+/* The engine's raw words. A word of RVX_BRNG_MCG59 has 59 bits and takes two numbers of r, low
+ * part first: r then holds 2 n numbers. */
 RVX_API int rvxiRngUniformBits(int64_t method, rvx_stream stream, int64_t n, uint32_t* r);
-/* 32 equidistributed bits for one result. */
+/* 32 equidistributed bits for one result. -1002 for RVX_BRNG_MCG31, _R250, _MRG32K3A, _WH, _SOBOL
+ * and _NIEDERR, whose words are no such bits. */
 RVX_API int rvxiRngUniformBits32(int64_t method, rvx_stream stream, int64_t n, uint32_t* r);
-/* 64 equidistributed bits for one result: two words, the first one in the low half. */
+/* The same with 64 bits: two words for each result, the first one in the low half. */
 RVX_API int rvxiRngUniformBits64(int64_t method, rvx_stream stream, int64_t n, uint64_t* r);
 
 #ifdef __cplusplus

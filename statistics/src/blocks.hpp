@@ -22,8 +22,13 @@ namespace tarn::statistics {
 struct word_source {
   const engine_ops* engine;
   void* state;
+  std::size_t state_bytes;
 
-  void fill(std::uint32_t* out, std::size_t n) const { engine->fill(state, out, n); }
+  void fill(std::uint32_t* out, std::size_t n) const {
+    if (engine->remaining != nullptr && n > engine->remaining(state))
+      throw sequence_ended();
+    engine->fill(state, out, n);
+  }
 };
 
 inline constexpr std::size_t block_words = 1024;
@@ -44,14 +49,15 @@ void turn_blocks(const word_source& source, std::size_t n, Value* out, bool stre
   alignas(line) std::uint32_t words[block_words];
   // Streaming stores want whole lines: a first short block leads up to the next line.
   const std::size_t lead = (line - reinterpret_cast<std::uintptr_t>(out) % line) % line;
-  std::size_t next = streaming && lead >= sizeof(Value) ? lead / sizeof(Value) : block_words;
+  const std::size_t block = block_words / source.engine->word_parts;
+  std::size_t next = streaming && lead >= sizeof(Value) ? lead / sizeof(Value) : block;
   while (n != 0) {
     const std::size_t count = std::min(n, next);
     source.fill(words, count);
     turn(words, count, out);
     out += count;
     n -= count;
-    next = block_words;
+    next = block;
   }
   if (streaming)
     flush_streaming();
@@ -71,13 +77,12 @@ void draw(const word_source& source, std::size_t n, std::size_t words_per_value,
     producer(source, n, out, streaming);
     return;
   }
-  const std::size_t state_bytes = source.engine->state_size({nullptr, 0});
   for_pieces(n, piece_words / words_per_value, threads, [&](std::size_t first, std::size_t count) {
     alignas(16) unsigned char state[max_parallel_state];
-    std::memcpy(state, source.state, state_bytes);
+    std::memcpy(state, source.state, source.state_bytes);
     const std::uint64_t distance = first * words_per_value;
     source.engine->skip(state, {&distance, 1});
-    producer(word_source{source.engine, state}, count, out + first, streaming);
+    producer(word_source{source.engine, state, source.state_bytes}, count, out + first, streaming);
   });
   const std::uint64_t distance = words;
   source.engine->skip(source.state, {&distance, 1});

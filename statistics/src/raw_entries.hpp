@@ -22,16 +22,13 @@ RVX_API int __rvxLoadStreamF(void** stream, const char* name, int length);
 RVX_API int __rvxSaveStreamM(void* stream, std::uint8_t* mem);
 RVX_API int __rvxLoadStreamM(void** stream, const std::uint8_t* mem);
 
-RVX_API int _rvxsRngUniform(int method, void* stream, int n, float* r, float a, float b);
-RVX_API int _rvxdRngUniform(int method, void* stream, int n, double* r, double a, double b);
-RVX_API int _rvxiRngUniform(int method, void* stream, int n, std::int32_t* r, std::int32_t a,
-                            std::int32_t b);
-RVX_API int _rvxiRngUniformBits(int method, void* stream, int n, std::uint32_t* r);
-RVX_API int _rvxiRngUniformBits32(int method, void* stream, int n, std::uint32_t* r);
-RVX_API int _rvxiRngUniformBits64(int method, void* stream, int n, std::uint64_t* r);
+#define TARN_UNWRAP(...) __VA_ARGS__
+#define TARN_ROUTINE(name, value, methods, width, parameters, arguments, check) \
+  RVX_API int _rvx##name(int method, void* stream, int n, value* r TARN_UNWRAP parameters);
+#include "statistics/common/routines.def"
 
-// Name of the SIMD target ("AVX3", "AVX2", "SSE4", "SSSE3", "SCALAR") that the latest kernel of
-// this process ran in, or an empty string before the first. For tests and bug reports.
+// Name of the SIMD target ("AVX3_DL", "AVX3", "AVX2", "SSE4", "SSSE3", "SCALAR") that the latest
+// kernel of this process ran in, or an empty string before the first. For tests and bug reports.
 RVX_API const char* __rvxGetSimdTarget(void);
 }
 // NOLINTEND(bugprone-reserved-identifier)

@@ -19,7 +19,8 @@ int find_stream(void* handle, live_stream& found) {
     return RVX_STATUS_BAD_MARK;
   found.engine = find_engine(found.record->code);
   if (found.engine == nullptr || found.record->length < sizeof(stream_header) ||
-      !found.engine->ops->accepts(found.state(), state_bytes(*found.record)))
+      !found.engine->ops->accepts(found.state(), state_bytes(*found.record),
+                                  found.record->code & member_mask))
     return RVX_STATUS_BAD_MARK;
   return RVX_STATUS_OK;
 }

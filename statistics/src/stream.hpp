@@ -13,10 +13,10 @@ namespace tarn::statistics {
 struct stream_header {
   std::uint32_t code;
   std::uint8_t mark;
-  std::uint8_t version;  // of the saved image
-  std::uint16_t spare;   // 0
-  std::uint32_t length;  // bytes of header and state
-  std::uint32_t check;   // of the saved image; 0 in a live stream
+  std::uint8_t version;      // of the saved image
+  std::uint16_t head_check;  // of the four other fields in a saved image; 0 in a live stream
+  std::uint32_t length;      // bytes of header and state
+  std::uint32_t check;       // of the whole saved image; 0 in a live stream
 };
 static_assert(sizeof(stream_header) == 16);
 static_assert(offsetof(stream_header, code) == 0 && offsetof(stream_header, mark) == 4);

@@ -28,6 +28,20 @@ int with_name(const char* name, int length, const Use& use) {
   }
 }
 
+int skip(const live_stream& stream, span<std::uint64_t> digits) {
+  const engine_ops& engine = *stream.engine->ops;
+  if (engine.skip == nullptr)
+    return RVX_STATUS_UNSUPPORTED;
+  if (engine.remaining != nullptr && digits.data[0] > engine.remaining(stream.state()))
+    return RVX_STATUS_END_OF_SEQUENCE;
+  try {
+    engine.skip(stream.state(), digits);
+  } catch (const std::bad_alloc&) {
+    return RVX_STATUS_NO_MEMORY;  // long jumps need room; the stream has not moved
+  }
+  return RVX_STATUS_OK;
+}
+
 int load(void** stream, int status, stream_header* loaded) {
   if (status == RVX_STATUS_OK)
     *stream = loaded;
@@ -48,13 +62,18 @@ int __rvxNewStreamEx(void** stream, int code, int n, const std::uint32_t* params
     return -4;
   const span<std::uint32_t> seed{params, static_cast<std::size_t>(n)};
   const auto full_code = static_cast<std::uint32_t>(code);
-  stream_header* made =
-      allocate_stream(full_code, sizeof(stream_header) + engine->ops->state_size(seed));
+  const std::size_t size = engine->ops->state_size(seed);
+  if (size == bad_seed)
+    return RVX_STATUS_BAD_CODE;
+  stream_header* made = allocate_stream(full_code, sizeof(stream_header) + size);
   if (made == nullptr)
     return RVX_STATUS_NO_MEMORY;
-  engine->ops->seed(state_of(made), full_code & member_mask, seed);
-  *stream = made;
-  return RVX_STATUS_OK;
+  const int status = engine->ops->seed(state_of(made), full_code & member_mask, seed);
+  if (status == RVX_STATUS_OK)
+    *stream = made;
+  else
+    free_stream(made);
+  return status;
 }
 
 int __rvxDeleteStream(void** stream) {
@@ -99,21 +118,23 @@ int __rvxLeapfrogStream(void* stream, int idx, int stride) {
 
 int __rvxSkipAheadStream(void* stream, std::int64_t count) {
   const auto digit = static_cast<std::uint64_t>(count);
-  return __rvxSkipAheadStreamEx(stream, 1, &digit);
+  live_stream found;
+  if (const int status = find_stream(stream, found); status != RVX_STATUS_OK)
+    return status;
+  return skip(found, {&digit, 1});
 }
 
 int __rvxSkipAheadStreamEx(void* stream, int n, const std::uint64_t* words) {
   live_stream found;
   if (const int status = find_stream(stream, found); status != RVX_STATUS_OK)
     return status;
-  if (found.engine->ops->skip == nullptr)
+  if (!found.engine->skip_list)
     return RVX_STATUS_UNSUPPORTED;
   if (n < 0)
     return -2;
   if (n > 0 && words == nullptr)
     return -3;
-  found.engine->ops->skip(found.state(), {words, static_cast<std::size_t>(n)});
-  return RVX_STATUS_OK;
+  return skip(found, {words, static_cast<std::size_t>(n)});
 }
 
 int __rvxGetStreamSize(void* stream) {

@@ -5,8 +5,11 @@
 #include <limits>
 
 #include "support.hpp"
+#include "uniform_calls.hpp"
 
 namespace {
+
+using support::bits;
 
 using uniform = support::on_simd_target;
 
@@ -21,27 +24,13 @@ struct rule {
   }
 };
 
-int draw(std::int64_t method, rvx_stream s, std::size_t n, float* r, float a, float b) {
-  return rvxsRngUniform(method, s, static_cast<std::int64_t>(n), r, a, b);
-}
-int draw(std::int64_t method, rvx_stream s, std::size_t n, double* r, double a, double b) {
-  return rvxdRngUniform(method, s, static_cast<std::int64_t>(n), r, a, b);
-}
-
-template <class Real>
-std::uint64_t bits(Real x) {
-  std::uint64_t b = 0;
-  std::memcpy(&b, &x, sizeof x);
-  return b;
-}
-
 template <class Real>
 void compare_range(support::stream& s, Real a, Real b, std::size_t n, std::size_t& unfused) {
   for (const std::int64_t method :
        {RVX_RNG_METHOD_UNIFORM_STD, RVX_RNG_METHOD_UNIFORM_STD_ACCURATE}) {
     plain::stream model = s.position();
     support::results<Real> r(n);
-    ASSERT_EQ(draw(method, s, n, r.data(), a, b), 0);
+    ASSERT_EQ(support::draw_uniform(method, s, n, r.data(), a, b), 0);
     const rule<Real> expected(a, b);
     for (std::size_t i = 0; i < n; ++i) {
       const std::uint32_t word = model.next();
@@ -139,7 +128,7 @@ TEST_F(uniform, interval_ends) {
   const auto draw_ends = [&](auto a, auto b, std::int64_t method) {
     s.set(key, plain::counter_of(end_words, key), 0);
     std::vector<decltype(a)> r(4);
-    EXPECT_EQ(draw(method, s, 4, r.data(), a, b), 0);
+    EXPECT_EQ(support::draw_uniform(method, s, 4, r.data(), a, b), 0);
     return r;
   };
   // The greatest word reads as 2^31 in float: rounding delivers the upper end itself.

@@ -131,11 +131,14 @@ class on_simd_target : public testing::Test {
     const char* wish = std::getenv("TARN_SIMD_TARGET");
     target_ = wish == nullptr ? "" : wish;
     __builtin_cpu_init();
-    const bool runs = target_ == "AVX3" ? __builtin_cpu_supports("avx512f") &&
-                                              __builtin_cpu_supports("avx512vl") &&
-                                              __builtin_cpu_supports("avx512bw") &&
-                                              __builtin_cpu_supports("avx512dq") &&
-                                              __builtin_cpu_supports("avx512cd")
+    const bool runs = target_ == "AVX3_DL" ? __builtin_cpu_supports("avx512vbmi2") &&
+                                                 __builtin_cpu_supports("vpclmulqdq") &&
+                                                 __builtin_cpu_supports("vaes")
+                      : target_ == "AVX3" ? __builtin_cpu_supports("avx512f") &&
+                                                __builtin_cpu_supports("avx512vl") &&
+                                                __builtin_cpu_supports("avx512bw") &&
+                                                __builtin_cpu_supports("avx512dq") &&
+                                                __builtin_cpu_supports("avx512cd")
                       : target_ == "AVX2"  ? __builtin_cpu_supports("avx2") != 0
                       : target_ == "SSE4"  ? __builtin_cpu_supports("sse4.2") != 0
                       : target_ == "SSSE3" ? __builtin_cpu_supports("ssse3") != 0

@@ -24,9 +24,9 @@ struct recorder {
 
 using calls = std::vector<std::pair<int, std::ptrdiff_t>>;
 
-int run(recorder& record, std::int64_t n, std::int64_t piece, int* r) {
+int run(recorder& record, std::int64_t n, std::int64_t piece, int* r, int width = 1) {
   record.base = r;
-  return in_pieces(n, r, piece, [&](int count, int* to) { return record(count, to); });
+  return in_pieces(n, r, width, piece, [&](int count, int* to) { return record(count, to); });
 }
 
 TEST(pieces, cover_the_results_in_order) {
@@ -42,6 +42,13 @@ TEST(pieces, cover_the_results_in_order) {
   EXPECT_TRUE(none.calls.empty());
 }
 
+TEST(pieces, results_of_two_values) {
+  std::vector<int> r(100);
+  recorder record;
+  EXPECT_EQ(run(record, 50, 20, r.data(), 2), 0);
+  EXPECT_EQ(record.calls, (calls{{20, 0}, {20, 40}, {10, 80}}));
+}
+
 TEST(pieces, stop_at_the_first_failure) {
   std::vector<int> r(100);
   recorder record;
@@ -55,7 +62,7 @@ TEST(pieces, counts_beyond_32_bits) {
   char base = 0;
   std::vector<int> counts;
   const std::int64_t n = std::int64_t{5} << 30;
-  EXPECT_EQ(in_pieces(n, &base, tarn::rvx::largest_piece,
+  EXPECT_EQ(in_pieces(n, &base, 1, tarn::rvx::largest_piece,
                       [&](int count, char*) {
                         counts.push_back(count);
                         return 0;

@@ -57,4 +57,16 @@ TEST(long_calls, come_in_pieces_until_one_fails) {
       << "a failure of the library is reported";
 }
 
+// A word of mcg59 has 59 bits and takes two values of the results.
+TEST(long_calls, pieces_of_wide_words_lie_twice_as_far_apart) {
+  rvx_stream stream = nullptr;
+  ASSERT_EQ(rvxNewStream(&stream, RVX_BRNG_MCG59, 1), 0);
+  std::uint32_t r = 0;
+  EXPECT_EQ(rvxiRngUniformBits(0, stream, (std::int64_t{1} << 31) + 1, &r), 0);
+  const recorded& record = record_of(stream);
+  ASSERT_EQ(record.calls, 2);
+  EXPECT_EQ(record.counts[1], 2);
+  EXPECT_EQ(record.offsets[1], std::int64_t{0x7FFFFFFF} * 8);
+}
+
 }  // namespace

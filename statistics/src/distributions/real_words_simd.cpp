@@ -142,10 +142,10 @@ HWY_INLINE hn::Vec<D> clamped(D d, hn::Vec<D> x, const finish<hn::TFromD<D>>& en
   return hn::IfThenElse(hn::Lt(raised, high), raised, high);
 }
 
-template <class D, class ToReal>
-HWY_INLINE void words_to_reals(D d, const std::uint32_t* words, std::size_t n,
-                               affine<hn::TFromD<D>> map, const finish<hn::TFromD<D>>& end,
-                               hn::TFromD<D>* out, const ToReal& to_real) {
+template <class D, class Word, class ToReal>
+HWY_INLINE void words_to_reals(D d, const Word* words, std::size_t n, affine<hn::TFromD<D>> map,
+                               const finish<hn::TFromD<D>>& end, hn::TFromD<D>* out,
+                               const ToReal& to_real) {
   const auto scale = hn::Set(d, map.scale);
   const auto offset = hn::Set(d, map.offset);
   if (end.clamp)
@@ -172,6 +172,42 @@ void signed_words_to_double(const std::uint32_t* words, std::size_t n, affine<do
                  [&](auto w) { return hn::PromoteTo(d, hn::BitCast(di, w)); });
 }
 
+void unsigned_words_to_float(const std::uint32_t* words, std::size_t n, affine<float> map,
+                             const finish<float>& end, float* out) {
+  const hn::ScalableTag<float> d;
+  words_to_reals(d, words, n, map, end, out, [&](auto w) { return hn::ConvertTo(d, w); });
+}
+
+void unsigned_words_to_double(const std::uint32_t* words, std::size_t n, affine<double> map,
+                              const finish<double>& end, double* out) {
+  const hn::ScalableTag<double> d;
+  const hn::ScalableTag<std::uint64_t> du;
+  words_to_reals(d, words, n, map, end, out,
+                 [&](auto w) { return hn::ConvertTo(d, hn::PromoteTo(du, w)); });
+}
+
+void wide_words_to_float(const std::uint32_t* words, std::size_t n, affine<float> map,
+                         const finish<float>& end, float* out) {
+  const hn::ScalableTag<std::uint64_t> du;
+  const hn::RebindToFloat<decltype(du)> dd;
+  const hn::Rebind<float, decltype(du)> d;
+  // Rounding to float by way of double is right if the first step rounds to odd (53 >= 24 + 2
+  // bits): the bits that a double cannot hold leave their trace in the last one that it can.
+  const auto lost = hn::Set(du, (std::uint64_t{1} << (wide_word_bits - 53)) - 1);
+  const auto last = hn::Set(du, std::uint64_t{1} << (wide_word_bits - 53));
+  words_to_reals(d, reinterpret_cast<const std::uint64_t*>(words), n, map, end, out, [&](auto w) {
+    const auto trace = hn::IfThenZeroElse(hn::Eq(hn::And(w, lost), hn::Zero(du)), last);
+    return hn::DemoteTo(d, hn::ConvertTo(dd, hn::AndNot(lost, hn::Or(w, trace))));
+  });
+}
+
+void wide_words_to_double(const std::uint32_t* words, std::size_t n, affine<double> map,
+                          const finish<double>& end, double* out) {
+  const hn::ScalableTag<double> d;
+  words_to_reals(d, reinterpret_cast<const std::uint64_t*>(words), n, map, end, out,
+                 [&](auto w) { return hn::ConvertTo(d, w); });
+}
+
 void floor_to_int32(const float* x, std::size_t n, bool streaming, std::int32_t* out) {
   const hn::ScalableTag<std::int32_t> d;
   const hn::Rebind<float, decltype(d)> df;
@@ -193,6 +229,10 @@ namespace tarn::statistics {
 
 HWY_EXPORT(signed_words_to_float);
 HWY_EXPORT(signed_words_to_double);
+HWY_EXPORT(unsigned_words_to_float);
+HWY_EXPORT(unsigned_words_to_double);
+HWY_EXPORT(wide_words_to_float);
+HWY_EXPORT(wide_words_to_double);
 HWY_EXPORT(floor_to_int32);
 
 void signed_words_to_float(const std::uint32_t* words, std::size_t n, affine<float> map,
@@ -203,6 +243,26 @@ void signed_words_to_float(const std::uint32_t* words, std::size_t n, affine<flo
 void signed_words_to_double(const std::uint32_t* words, std::size_t n, affine<double> map,
                             const finish<double>& end, double* out) {
   TARN_SIMD_CALL(signed_words_to_double)(words, n, map, end, out);
+}
+
+void unsigned_words_to_float(const std::uint32_t* words, std::size_t n, affine<float> map,
+                             const finish<float>& end, float* out) {
+  TARN_SIMD_CALL(unsigned_words_to_float)(words, n, map, end, out);
+}
+
+void unsigned_words_to_double(const std::uint32_t* words, std::size_t n, affine<double> map,
+                              const finish<double>& end, double* out) {
+  TARN_SIMD_CALL(unsigned_words_to_double)(words, n, map, end, out);
+}
+
+void wide_words_to_float(const std::uint32_t* words, std::size_t n, affine<float> map,
+                         const finish<float>& end, float* out) {
+  TARN_SIMD_CALL(wide_words_to_float)(words, n, map, end, out);
+}
+
+void wide_words_to_double(const std::uint32_t* words, std::size_t n, affine<double> map,
+                          const finish<double>& end, double* out) {
+  TARN_SIMD_CALL(wide_words_to_double)(words, n, map, end, out);
 }
 
 void floor_to_int32(const float* x, std::size_t n, bool streaming, std::int32_t* out) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Uniform variates and raw words: producers for blocks.hpp.
+// Uniform variates: producers for blocks.hpp.
 #pragma once
 
 #include <cstddef>
@@ -52,20 +52,5 @@ struct uniform_int32 {
                 });
   }
 };
-
-// The engine's words as they are, of 32 bits or two to a value, the first in the low half. They go
-// straight into the results: a detour through a block for the sake of streaming stores costs more
-// than it saves (measured for 100 million words: 4.7 against 6.1 thousand million a second on one
-// thread, 8.0 against 7.7 on two).
-template <class Value>
-struct raw_words {
-  static constexpr std::size_t words_per_value = sizeof(Value) / sizeof(std::uint32_t);
-
-  void operator()(const word_source& source, std::size_t n, Value* out, bool) const {
-    source.fill(reinterpret_cast<std::uint32_t*>(out), n * words_per_value);
-  }
-};
-
-static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "values are written word by word");
 
 }  // namespace tarn::statistics

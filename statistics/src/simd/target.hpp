@@ -5,12 +5,14 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 
 namespace tarn::statistics {
 
-// The row of Highway's dispatch tables to call: the best target of this processor, or the one
-// that the environment variable TARN_SIMD_TARGET names. Decided once per process.
-std::size_t simd_row();
+// The row to call of a dispatch table that was compiled for `targets` (bits of Highway): the best
+// one that this processor runs, or the best one not above the target that the environment variable
+// TARN_SIMD_TARGET names. The limit is decided once per process.
+std::size_t simd_row(std::int64_t targets);
 
 // Kernels tell the name of the target they were compiled for.
 void note_simd_target(const char* name);
@@ -21,4 +23,5 @@ const char* latest_simd_target();
 }  // namespace tarn::statistics
 
 // Calls the chosen target's variant of a function given to HWY_EXPORT in this source.
-#define TARN_SIMD_CALL(function) (HWY_DISPATCH_TABLE(function)[::tarn::statistics::simd_row()])
+#define TARN_SIMD_CALL(function) \
+  (HWY_DISPATCH_TABLE(function)[::tarn::statistics::simd_row(HWY_TARGETS)])

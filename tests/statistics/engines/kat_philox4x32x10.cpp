@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The words of philox4x32x10 against published answers, through the public C interface.
-#include "../kat/philox_cases.hpp"
+#include "../../kat/philox_cases.hpp"
 #include "support.hpp"
 
 namespace {

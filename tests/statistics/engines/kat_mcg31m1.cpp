@@ -1,0 +1,16 @@
+// SPDX-License-Identifier: Apache-2.0
+// The words of mcg31m1 against published answers.
+#include "multiplicative_answers.hpp"
+
+namespace {
+
+using kat = support::on_simd_target;
+
+TEST_F(kat, published_words_skipped_to_and_drawn) {
+  const auto answers = multiplicative::answers("mcg31m1");
+  ASSERT_EQ(answers.size(), 9u);
+  for (const auto& known : answers)
+    multiplicative::expect_answer(RVX_BRNG_MCG31, 1, known);
+}
+
+}  // namespace

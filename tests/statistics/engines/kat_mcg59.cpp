@@ -1,0 +1,16 @@
+// SPDX-License-Identifier: Apache-2.0
+// The words of mcg59 against published answers.
+#include "multiplicative_answers.hpp"
+
+namespace {
+
+using kat = support::on_simd_target;
+
+TEST_F(kat, published_words_skipped_to_and_drawn) {
+  const auto answers = multiplicative::answers("mcg59");
+  ASSERT_EQ(answers.size(), 6u);
+  for (const auto& known : answers)
+    multiplicative::expect_answer(RVX_BRNG_MCG59, 2, known);
+}
+
+}  // namespace
