@@ -8,6 +8,7 @@
 #include "checks.hpp"
 #include "entry.hpp"
 #include "pieces.hpp"
+#include "statistics/common/engine_code.hpp"
 #include "statistics/common/parameters.hpp"
 #include "tarn_rvx.h"
 
@@ -26,10 +27,9 @@ int report_failure(const char* name, int status) {
 
 // Values that one raw word of the stream's engine takes: words of more than 32 bits take two.
 int values_per_word(rvx_stream stream) {
-  constexpr std::uint32_t member_mask = 0xFFFFF;
   std::uint32_t code;
   std::memcpy(&code, stream, sizeof code);
-  switch (code & ~member_mask) {
+  switch (code & ~tarn::statistics::member_mask) {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
                     uniform_bits, built)                                                     \
   case code:                                                                                 \

@@ -5,6 +5,8 @@
 #include <cstdarg>
 #include <cstdio>
 
+#include "statistics/common/engine_code.hpp"
+#include "tarn_rvx.h"
 #include "tarn_serv.h"
 
 namespace tarn::rvx {
@@ -16,19 +18,12 @@ struct engine_label {
   const char* text;
 };
 
-// All engines that have a code, also those that the statistics library does not have yet.
 constexpr engine_label labels[] = {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
                     uniform_bits, built)                                                     \
   {code, "RVX_BRNG_" #label},
 #include "rng/engines/engines.def"
 };
-
-constexpr std::int64_t member_mask = 0xFFFFF;
-
-// The engines that are sets of generators: the low bits of the code number the member.
-constexpr std::int64_t wichmann_hill_code = 0x500000;
-constexpr std::int64_t mt2203_code = 0x900000;
 
 }  // namespace
 
@@ -48,9 +43,9 @@ void verbose_call::print(const char* format, ...) const {
 }
 
 const char* engine_text(std::int64_t code, char* out) {
-  const std::int64_t member = code & member_mask;
+  const std::int64_t member = code & std::int64_t{statistics::member_mask};
   const std::int64_t set = code - member;
-  const bool is_set = set == wichmann_hill_code || set == mt2203_code;
+  const bool is_set = set == RVX_BRNG_WH || set == RVX_BRNG_MT2203;
   const char* name = "Unknown engine";
   for (const engine_label& label : labels) {
     if (label.code == set && (is_set || member == 0))

@@ -144,7 +144,8 @@ RVX_API int rvxLoadStreamF(rvx_stream* stream, const char* name, int length);
  *   stream  (-5, -1006)
  *   n       count of results, 0 or more (-3); 0 does nothing
  *   r       n results (-4)
- * then the distribution's parameters. Also -1002 where the engine does not offer the routine,
+ * then the distribution's parameters. A call of more than 2^31 - 1 results goes in pieces: when one
+ * fails, those before it stand and the stream is behind them. Also -1002 where the engine does not offer the routine,
  * -1005 past the end of a finite sequence, -1004 when an outer source fails, -1001. */
 
 /* Uniform on [a, b), a < b (-5): the word-to-real rule of the engine, one word for one result. The
@@ -154,7 +155,8 @@ RVX_API int rvxsRngUniform(int64_t method, rvx_stream stream, int64_t n, float* 
                            float b);
 RVX_API int rvxdRngUniform(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
                            double b);
-/* Integers of [a, b), a < b (-5): floor of a float uniform, so a range wider than 2^24 has gaps. */
+/* Integers of [a, b), a < b (-5): floor of a float uniform, so a range wider than 2^24 has gaps,
+ * and rounding may deliver b itself. */
 RVX_API int rvxiRngUniform(int64_t method, rvx_stream stream, int64_t n, int32_t* r, int32_t a,
                            int32_t b);
 /* The engine's raw words. A word of RVX_BRNG_MCG59 has 59 bits and takes two numbers of r, low

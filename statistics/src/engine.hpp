@@ -8,6 +8,8 @@
 #include <cstdint>
 #include <exception>
 
+#include "statistics/common/engine_code.hpp"
+
 namespace tarn::statistics {
 
 struct word_rule;
@@ -80,7 +82,5 @@ struct engine_row {
 
 // The row that a stream code belongs to, or null. The low 20 bits number the members of a set.
 const engine_row* find_engine(std::uint32_t code);
-
-inline constexpr std::uint32_t member_mask = 0xFFFFF;
 
 }  // namespace tarn::statistics

@@ -14,7 +14,8 @@ namespace tarn::statistics {
 void write_image(const stream_header& stream, std::uint8_t* image);
 
 // Reads the header at `image`, of at least 16 bytes, and gives the length of the whole image, or
-// 0 if this is no header of an image: wrong mark, version, code or a length below the header's.
+// 0 if this is no header of an image: wrong mark, version, code or sum, or a length below the
+// header's.
 std::size_t image_length(const std::uint8_t* image);
 
 // Makes a stream of an image of `length` bytes: 0 or a negative status, `out` written on success.

@@ -38,7 +38,8 @@ void for_pieces(std::size_t n, std::size_t piece, int threads,
                 const std::function<void(std::size_t first, std::size_t count)>& body) {
   char started = 0, finished = 0;
   publish(&started);
-  tbb::task_arena arena(threads);
+  // More threads than processors gain nothing, and the pool would say so on standard error.
+  tbb::task_arena arena(std::min(threads, tbb::this_task_arena::max_concurrency()));
   arena.execute([&] {
     tbb::parallel_for(tbb::blocked_range<std::size_t>(0, (n + piece - 1) / piece, 1),
                       [&](const tbb::blocked_range<std::size_t>& pieces) {

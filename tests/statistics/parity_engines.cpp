@@ -3,6 +3,7 @@
 // services it lacks, and images that go on. What the words are is the affair of the engines' own
 // tests.
 #include <functional>
+#include <tuple>
 
 #include "every_engine.hpp"
 
@@ -72,6 +73,26 @@ TEST_P(repeating_engines, splits_give_the_serial_stream) {
     any_stream reference = serial;
     ASSERT_NO_FATAL_FAILURE(expect_same(s, reference));
   }
+}
+
+// Calls large enough to be shared out: the words, the reals and the place behind them are those of
+// one thread.
+TEST_P(repeating_engines, threads_change_nothing) {
+  constexpr std::size_t n = 300'001;
+  const auto draw_all = [this](int threads) {
+    const int before = tarn_serv_get_max_threads();
+    tarn_serv_set_max_threads(threads);
+    any_stream s = engine().make();
+    words all = draw(s, n);
+    std::vector<float> reals(n);
+    EXPECT_EQ(rvxsRngUniform(0, s, n, reals.data(), -1, 1), 0);
+    const auto image = s.image();
+    tarn_serv_set_max_threads(before);
+    return std::make_tuple(all, reals, image);
+  };
+  const auto alone = draw_all(1);
+  for (int threads : {2, 3, 8})
+    EXPECT_TRUE(draw_all(threads) == alone) << threads << " threads";
 }
 
 TEST_P(engines, no_words_leave_the_stream_where_it_is) {

@@ -127,8 +127,8 @@ TEST(images, random_damage_is_refused) {
   }
 }
 
-// An impossible field is refused even if the check sum fits it: a state written by a faulty
-// program, brought here by changing the live record under the library's feet.
+// An impossible field is refused even if the check sum fits it, as in an image that a faulty
+// program made.
 TEST(images, impossible_fields_are_refused_with_a_right_check_sum) {
   const auto check_sum = [](const bytes& image) {
     std::uint32_t sum = 0x811C9DC5;  // FNV-1a, the sum's own bytes read as zero
@@ -163,6 +163,30 @@ TEST_F(files, round_trip_and_replacing) {
   ASSERT_EQ(rvxLoadStreamF(&loaded, name.c_str(), -1), 0);
   expect_same_future(second, loaded);
   EXPECT_EQ(rvxDeleteStream(&loaded), 0);
+}
+
+TEST_F(files, names_as_long_as_the_file_system_takes) {
+  support::stream s(3);
+  const std::string name = path(std::string(255, 'n'));
+  ASSERT_EQ(rvxSaveStreamF(s, name.c_str(), -1), 0);
+  ASSERT_EQ(rvxSaveStreamF(s, name.c_str(), -1), 0);
+  EXPECT_EQ(list(), std::vector<std::string>{std::string(255, 'n')});
+  EXPECT_EQ(load(std::string(255, 'n')), 0);
+}
+
+TEST_F(files, a_save_keeps_the_mode_and_the_link) {
+  support::stream s(3);
+  ASSERT_EQ(rvxSaveStreamF(s, path("private").c_str(), -1), 0);
+  ASSERT_EQ(chmod(path("private").c_str(), 0600), 0);
+  ASSERT_EQ(symlink("private", path("link").c_str()), 0);
+  ASSERT_EQ(rvxSaveStreamF(s, path("link").c_str(), -1), 0);
+  struct stat file {
+  }, link{};
+  ASSERT_EQ(stat(path("private").c_str(), &file), 0);
+  ASSERT_EQ(lstat(path("link").c_str(), &link), 0);
+  EXPECT_EQ(file.st_mode & 07777, 0600u);
+  EXPECT_TRUE(S_ISLNK(link.st_mode));
+  EXPECT_EQ(load("link"), 0);
 }
 
 TEST_F(files, names_with_a_length_need_no_terminator) {
@@ -204,10 +228,15 @@ TEST_F(files, missing_files_and_folders) {
   EXPECT_EQ(rvxSaveStreamF(s, path("no/such/folder").c_str(), -1), RVX_STATUS_FILE_OPEN);
   EXPECT_EQ(rvxSaveStreamF(s, "", 0), RVX_STATUS_FILE_WRITE);
   EXPECT_EQ(load(""), RVX_STATUS_FILE_READ) << "a folder is no image";
-  // The target is a folder: the rename fails and the new file goes away.
+  // A folder, or what else is no plain file, is not replaced.
   ASSERT_EQ(mkdir(path("folder").c_str(), 0700), 0);
   EXPECT_EQ(rvxSaveStreamF(s, path("folder").c_str(), -1), RVX_STATUS_FILE_WRITE);
   EXPECT_EQ(list(), std::vector<std::string>{"folder"});
+  ASSERT_EQ(mkfifo(path("pipe").c_str(), 0600), 0);
+  EXPECT_EQ(rvxSaveStreamF(s, path("pipe").c_str(), -1), RVX_STATUS_FILE_WRITE);
+  struct stat pipe {};
+  ASSERT_EQ(stat(path("pipe").c_str(), &pipe), 0);
+  EXPECT_TRUE(S_ISFIFO(pipe.st_mode));
 }
 
 // A disk without room, played by the limit of the size of files.

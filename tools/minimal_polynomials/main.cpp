@@ -135,4 +135,5 @@ int main() {
       "// clang-format off\n");
   print("mt19937", minimal(mt19937_words));
   print("sfmt19937", minimal(sfmt19937_words));
+  return std::fflush(stdout) == 0 && std::ferror(stdout) == 0 ? 0 : 1;
 }

@@ -50,7 +50,7 @@ class counter_engine {
     std::uint32_t ctr[4];  // least significant word first
     std::uint32_t idx;
   };
-  static_assert(sizeof(record) == 4 * (key_words + 5));
+  static_assert(sizeof(record) == 4 * (key_words + 5) && sizeof(record) <= max_parallel_state);
 
   static constexpr wide one{1, 0};
   static constexpr wide minus_one{~std::uint64_t{0}, ~std::uint64_t{0}};

@@ -12,7 +12,10 @@
 namespace tarn::statistics::net {
 
 enum field : std::size_t {
-  index_field,       // of the point in progress or, when none is, of the next one; 0: at the end
+  // Of the point in progress or, when none is, of the next one. 0: at the end; who steps a record
+  // by
+  // himself must not take that for point 0.
+  index_field,
   dims_field,        // number of dimensions
   marker_field,      // made_here
   owed_field,        // coordinates that the point in progress still owes; 0: none is in progress

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The generator x -> 13^13 x mod 2^59 (the basic generator of the NAG library). Its states are odd
+// The generator x -> 13^13 x mod 2^59 (the basic generator of the NAG Fortran Library: its manual,
+// chapter G05). Its states are odd
 // and its period is 2^57.
 #pragma once
 

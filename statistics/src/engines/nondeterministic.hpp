@@ -39,10 +39,10 @@ inline const entropy_source* choose(span<entropy_source> sources) {
 }
 
 // Draws n words from an instruction for 64-bit numbers that may find its buffer empty: next(number)
-// says whether it gave one. Intel's guide to RDRAND asks for ten tries, within which a working unit
-// refills its buffer. There are also processors whose instruction, once broken, reports success and
-// gives one number for ever: equal neighbours mean failure, though a working unit gives them with
-// probability 2^-64 a pair.
+// says whether it gave one. Ten tries are what the guides to RDRAND ask for: within them a working
+// unit refills its buffer. There are also processors whose instruction, once broken, reports
+// success and gives one number for ever: equal neighbours mean failure, though a working unit gives
+// them with probability 2^-64 a pair.
 template <class Next>
 bool draw_numbers(const Next& next, std::uint32_t* out, std::size_t n) {
   constexpr int tries = 10;

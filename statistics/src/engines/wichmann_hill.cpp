@@ -23,7 +23,7 @@ struct wichmann_hill_state {
   std::uint32_t state[components];  // whose word is next
   std::uint32_t multiplier[components];
 };
-static_assert(sizeof(wichmann_hill_state) == 36);
+static_assert(sizeof(wichmann_hill_state) == 36 && 36 <= max_parallel_state);
 
 wichmann_hill_state load(const void* state) {
   wichmann_hill_state s;
