@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// generate over the rows that are built, on every device: what a whole call costs, from one result
-// (the cost of the frame) to 16 million. Names read device/engine/distribution/n.
+// generate over the rows with a device road, on every device: what a whole call costs, from one
+// result (the cost of the frame) to 16 million. Names read device/engine/distribution/n.
 #include <cstdlib>
 #include <cstring>
 #include <string>

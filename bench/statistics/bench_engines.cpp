@@ -153,13 +153,7 @@ void add_peers() {
 
 int main(int argc, char** argv) {
   __builtin_cpu_init();
-  // Interleaving spreads the noise of a shared machine over all benchmarks alike.
-  std::vector<char*> arguments(argv, argv + argc);
-  char interleaved[] = "--benchmark_enable_random_interleaving=true";
-  arguments.insert(arguments.begin() + 1, interleaved);
-  int arguments_count = static_cast<int>(arguments.size());
-  benchmark::Initialize(&arguments_count, arguments.data());
-  if (benchmark::ReportUnrecognizedArguments(arguments_count, arguments.data()))
+  if (!initialize(argc, argv))
     return 1;
   tarn_serv_set_max_threads(1);
   for (const engine_row& engine : engines)

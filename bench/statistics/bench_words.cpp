@@ -121,13 +121,7 @@ void print_ratios(const ratio_reporter& r) {
 }  // namespace
 
 int main(int argc, char** argv) {
-  // Interleaving spreads the noise of a shared machine over all benchmarks alike.
-  std::vector<char*> arguments(argv, argv + argc);
-  char interleaved[] = "--benchmark_enable_random_interleaving=true";
-  arguments.insert(arguments.begin() + 1, interleaved);
-  int count = static_cast<int>(arguments.size());
-  benchmark::Initialize(&count, arguments.data());
-  if (benchmark::ReportUnrecognizedArguments(count, arguments.data()))
+  if (!initialize(argc, argv))
     return 1;
 
   rvx_stream stream = nullptr;

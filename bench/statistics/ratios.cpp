@@ -4,6 +4,15 @@
 
 #include <cstdio>
 
+bool initialize(int argc, char** argv) {
+  std::vector<char*> arguments(argv, argv + argc);
+  char interleaved[] = "--benchmark_enable_random_interleaving=true";
+  arguments.insert(arguments.begin() + 1, interleaved);
+  int count = static_cast<int>(arguments.size());
+  benchmark::Initialize(&count, arguments.data());
+  return !benchmark::ReportUnrecognizedArguments(count, arguments.data());
+}
+
 void ratio_reporter::ReportRuns(const std::vector<Run>& runs) {
   for (const Run& run : runs) {
     if (run.aggregate_name != "median")

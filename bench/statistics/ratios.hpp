@@ -9,12 +9,21 @@
 
 #include <benchmark/benchmark.h>
 
+// Takes the command line for the benchmarks, whose runs are interleaved: that spreads the noise of
+// a shared machine over all of them alike. False if it does not understand an argument.
+bool initialize(int argc, char** argv);
+
 class ratio_reporter : public benchmark::ConsoleReporter {
  public:
   void ReportRuns(const std::vector<Run>& runs) override;
 
   // Median rate of a benchmark (values per second), or 0 if it did not run.
   double rate(const std::string& name) const;
+
+  // Notes a rate that was measured elsewhere.
+  void set_rate(const std::string& name, double values_per_second) {
+    rates_[name] = values_per_second;
+  }
 
   // One line: the median time of one iteration and whether it is below `limit` (nanoseconds).
   void print_time(const std::string& of, double limit) const;

@@ -1,5 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-// Every distribution that can be drawn: functors and routines.
+// Every family: its routines on the host, and its functors where its device road is built.
 #pragma once
 
+#include "distributions/gamma.hpp"
+#include "distributions/gaussian.hpp"
+#include "distributions/gaussian_mv.hpp"
+#include "distributions/inverse_cdf.hpp"
+#include "distributions/poisson.hpp"
+#include "distributions/trials.hpp"
 #include "distributions/uniform.hpp"

@@ -14,8 +14,8 @@
 #include <kestrel/tarn/rng/continuous.hpp>
 #include <sycl/sycl.hpp>
 
+#include "distributions/host_routine.hpp"
 #include "distributions/uniform_integers.hpp"
-#include "frame/engine_backend.hpp"
 
 namespace kestrel::tarn::rng::detail::gpu {
 
@@ -144,31 +144,30 @@ struct distribution_impl<UIntType, uniform_bits<UIntType>, device_type::gpu> {
   functor kernel;
 };
 
+template <>
+inline constexpr std::int64_t method_code<uniform_method::accurate> =
+    RVX_RNG_METHOD_UNIFORM_STD_ACCURATE;
+
 template <typename T, typename Method>
 struct distribution_impl<T, uniform<T, Method>, device_type::cpu> {
-  explicit distribution_impl(const uniform<T, Method>& distr) : a(distr.a()), b(distr.b()) {}
+  const uniform<T, Method>& distr;
 
   int generate(rvx_stream stream, std::int64_t n, T* r) const {
-    constexpr std::int64_t method =
-        is_accurate<Method> ? RVX_RNG_METHOD_UNIFORM_STD_ACCURATE : RVX_RNG_METHOD_UNIFORM_STD;
-    if constexpr (std::is_same_v<T, float>) {
-      return rvxsRngUniform(method, stream, n, r, a, b);
-    } else if constexpr (std::is_same_v<T, double>) {
-      return rvxdRngUniform(method, stream, n, r, a, b);
+    constexpr std::int64_t method = method_code<Method>;
+    if constexpr (std::is_floating_point_v<T>) {
+      return real_routine<T>(rvxsRngUniform, rvxdRngUniform)(method, stream, n, r, distr.a(),
+                                                             distr.b());
     } else if constexpr (std::is_same_v<T, std::int32_t> && !is_accurate<Method>) {
-      return rvxiRngUniform(RVX_RNG_METHOD_UNIFORM_STD, stream, n, r, a, b);
+      return rvxiRngUniform(method, stream, n, r, distr.a(), distr.b());
     } else {
-      return uniform_integers(stream, n, r, a, b);
+      return uniform_integers(stream, n, r, distr.a(), distr.b());
     }
   }
-
-  T a;
-  T b;
 };
 
 template <typename UIntType>
 struct distribution_impl<UIntType, bits<UIntType>, device_type::cpu> {
-  explicit distribution_impl(const bits<UIntType>&) {}
+  const bits<UIntType>& distr;
 
   int generate(rvx_stream stream, std::int64_t n, UIntType* r) const {
     return rvxiRngUniformBits(RVX_RNG_METHOD_STANDARD, stream, n, r);
@@ -177,7 +176,7 @@ struct distribution_impl<UIntType, bits<UIntType>, device_type::cpu> {
 
 template <typename UIntType>
 struct distribution_impl<UIntType, uniform_bits<UIntType>, device_type::cpu> {
-  explicit distribution_impl(const uniform_bits<UIntType>&) {}
+  const uniform_bits<UIntType>& distr;
 
   int generate(rvx_stream stream, std::int64_t n, UIntType* r) const {
     if constexpr (std::is_same_v<UIntType, std::uint32_t>) {

@@ -25,4 +25,29 @@ void check_output(std::int64_t n, std::size_t buffer_size, std::int64_t values) 
   }
 }
 
+void check_rates(std::size_t rates, std::int64_t n) {
+  if (static_cast<std::int64_t>(rates) != n) {
+    throw invalid_argument("rng", "poisson_v", "lambda size should be equal to n");
+  }
+}
+
+device_type road_of(const sycl::queue& queue) {
+  const sycl::device device = queue.get_device();
+  if (device.is_cpu()) {
+    return device_type::cpu;
+  }
+  if (device.is_gpu()) {
+    return device_type::gpu;
+  }
+  refuse_device(queue);
+}
+
+void refuse_device(const sycl::queue& queue) {
+  throw unsupported_device("rng", "generate", queue.get_device());
+}
+
+void refuse_device_road(const char* name, const char* kind) {
+  throw unimplemented("rng", "generate", std::string(name) + " " + kind + " on a GPU");
+}
+
 }  // namespace kestrel::tarn::rng::detail

@@ -14,18 +14,23 @@
 
 namespace kestrel::tarn::rng::detail {
 
-/// Values that one result of `distr` fills: more than one for vectors and rows of counts.
-template <typename Distr>
+/// Values that one result of `distr` fills: more than one for vectors, rows of counts, and raw
+/// words of more than 32 bits.
+template <typename Engine, typename Distr>
 std::int64_t values_per_result(const Distr&) {
   return 1;
 }
-template <typename T, matrix_layout layout, typename Method>
+template <typename Engine, typename T, matrix_layout layout, typename Method>
 std::int64_t values_per_result(const gaussian_mv<T, layout, Method>& distr) {
   return distr.dimension();
 }
-template <typename T, typename Method>
+template <typename Engine, typename T, typename Method>
 std::int64_t values_per_result(const multinomial<T, Method>& distr) {
   return static_cast<std::int64_t>(distr.p().size());
+}
+template <typename Engine>
+std::int64_t values_per_result(const bits<std::uint32_t>&) {
+  return (engine_row<Engine>::word_bits + 31) / 32;
 }
 
 /// Raise invalid_argument: "n" first, then "r". A buffer must hold every value that the call
@@ -33,14 +38,33 @@ std::int64_t values_per_result(const multinomial<T, Method>& distr) {
 void check_output(std::int64_t n, const void* r);
 void check_output(std::int64_t n, std::size_t buffer_size, std::int64_t values_per_result);
 
-template <typename Distr, typename T>
+template <typename Engine, typename Distr, typename T>
 void check_output(const Distr&, std::int64_t n, T* r) {
   check_output(n, r);
 }
-template <typename Distr, typename T>
+template <typename Engine, typename Distr, typename T>
 void check_output(const Distr& distr, std::int64_t n, sycl::buffer<T, 1>& r) {
-  check_output(n, r.size(), values_per_result(distr));
+  check_output(n, r.size(), values_per_result<Engine>(distr));
 }
+
+/// Raises invalid_argument ("poisson_v") unless there is one rate for each result.
+void check_rates(std::size_t rates, std::int64_t n);
+
+/// What a distribution asks of the count of results.
+template <typename Distr>
+void check_count(const Distr&, std::int64_t) {}
+template <typename T, typename Method>
+void check_count(const poisson_v<T, Method>& distr, std::int64_t n) {
+  check_rates(distr.lambda().size(), n);
+}
+
+/// The kind of the queue's device, asked anew on each call. Raises unsupported_device where it is
+/// neither.
+device_type road_of(const sycl::queue& queue);
+[[noreturn]] void refuse_device(const sycl::queue& queue);
+
+/// For what is meant for GPUs and has no device road yet.
+[[noreturn]] void refuse_device_road(const char* name, const char* kind);
 
 template <typename Distr>
 inline constexpr bool is_uniform_bits = false;

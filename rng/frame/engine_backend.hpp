@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // Implementations of an engine, one per kind of device. Which one an object is follows from the
 // device of its queue and is decided anew on each call: the only virtual operation is the
-// destructor. Bodies of `generate` stand in host_road.hpp and device_road.hpp, which only the
-// modules <engine>_cpu and <engine>_gpu include.
+// destructor. The host road is the same for all engines (host_road.hpp); the body of `generate` on
+// a device stands in device_road.hpp, which only the modules <engine>_gpu include.
 #pragma once
 
 #include <cstdint>
@@ -31,16 +31,11 @@ class engine_base_impl {
 template <typename Engine, device_type device>
 class engine_base_impl_backend;
 
-/// The host road is the same for all engines: a routine of the statistics library on the stream.
+/// The host road needs the stream and nothing else.
 template <typename Engine>
 class engine_base_impl_backend<Engine, device_type::cpu> : public engine_base_impl<Engine> {
  public:
   using engine_base_impl<Engine>::engine_base_impl;
-
-  /// `Out` is T* or sycl::buffer<T, 1>&; returns the event of the finished call.
-  template <typename T, typename Distribution, typename Out>
-  sycl::event generate(sycl::queue& queue, std::int64_t n, Out r, Distribution distribution,
-                       const std::vector<sycl::event>& dependencies);
 };
 
 /// The device road of engines whose state travels to each kernel by value. Engines with state on
@@ -50,7 +45,7 @@ class engine_base_impl_backend<Engine, device_type::gpu> : public engine_base_im
  public:
   using engine_base_impl<Engine>::engine_base_impl;
 
-  /// As above; returns the event of the kernel, which may not have run.
+  /// `Out` is T* or sycl::buffer<T, 1>&; returns the event of the kernel, which may not have run.
   template <typename T, typename Distribution, typename Out>
   sycl::event generate(sycl::queue& queue, std::int64_t n, Out r, Distribution distribution,
                        const std::vector<sycl::event>& dependencies);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // The frame of every generate call: verbose report around it, checks in a fixed order, then the
-// road by the device of the engine's queue, asked anew on each call.
+// road by the device of the engine's queue.
 #pragma once
 
 #include <cstdint>
@@ -11,13 +11,31 @@
 #include <kestrel/tarn/rng/generate.hpp>
 #include <sycl/sycl.hpp>
 
-#include "distributions/all.hpp"
 #include "frame/checks.hpp"
 #include "frame/engine_backend.hpp"
+#include "frame/host_road.hpp"
 #include "frame/rows.hpp"
 #include "frame/verbose_call.hpp"
 
 namespace kestrel::tarn::rng::detail {
+
+/// The device road, where the engine and the distribution have one.
+template <typename Distr, typename Engine, typename Out>
+sycl::event generate_on_gpu(sycl::queue& queue, const Distr& distr, engine_base_impl<Engine>* impl,
+                            std::int64_t n, Out r, const std::vector<sycl::event>& dependencies) {
+  using row = distribution_row<Distr>;
+  if constexpr (!engine_row<Engine>::gpu) {
+    refuse_device(queue);
+  } else if constexpr (!engine_row<Engine>::device_road) {
+    refuse_device_road(engine_row<Engine>::name, "engine");
+  } else if constexpr (!row::device_road) {
+    refuse_device_road(row::family, "distribution");
+  } else if constexpr (row::entry == device_entry::generate_ex) {
+    return gpu::generate_ex<Engine, Distr>(queue, distr, impl, n, r, dependencies).first;
+  } else {
+    return gpu::generate<Engine, Distr>(queue, distr, impl, n, r, dependencies);
+  }
+}
 
 /// The backend frame. `Out` is T* or sycl::buffer<T, 1>&. Out of line, as an entry calls it in two
 /// places and there are thousands of entries.
@@ -28,27 +46,16 @@ template <typename Distr, typename Engine, typename Out>
   if constexpr (is_refused<Distr, Engine>) {
     refuse_uniform_bits<Engine>();
   } else {
-    using T = typename Distr::result_type;
-    check_output(distr, n, r);
+    check_output<Engine>(distr, n, r);
     sycl::queue& queue = engine.get_queue();
+    const device_type road = road_of(queue);
+    check_count(distr, n);
     auto* impl = engine_access::impl(engine);
-    const sycl::device device = queue.get_device();
-    if (device.is_cpu()) {
-      using backend = engine_base_impl_backend<Engine, device_type::cpu>;
-      using distribution = distribution_impl<T, Distr, device_type::cpu>;
-      return static_cast<backend*>(impl)->template generate<T, distribution, Out>(
-          queue, n, r, distribution(distr), dependencies);
+    if (road == device_type::gpu) {
+      return generate_on_gpu<Distr, Engine, Out>(queue, distr, impl, n, r, dependencies);
     }
-    if constexpr (engine_row<Engine>::gpu) {
-      if (device.is_gpu()) {
-        if constexpr (distribution_row<Distr>::entry == device_entry::generate_ex) {
-          return gpu::generate_ex<Engine, Distr>(queue, distr, impl, n, r, dependencies).first;
-        } else {
-          return gpu::generate<Engine, Distr>(queue, distr, impl, n, r, dependencies);
-        }
-      }
-    }
-    throw unsupported_device("rng", "generate", device);
+    const host_call call{&run_host_routine<Distr>, &distr, impl->stream.get(), n};
+    return run_host_call(queue, call, r, dependencies);
   }
 }
 

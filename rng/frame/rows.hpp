@@ -18,14 +18,16 @@ namespace kestrel::tarn::rng::detail {
 template <typename Engine>
 struct engine_row;
 
-#define TARN_ENGINE(name_, code_, label, word_bits, seed_type, gpu_, skip, skip_list, leapfrog, \
-                    uniform_bits_, built)                                                       \
-  template <>                                                                                   \
-  struct engine_row<name_> {                                                                    \
-    static constexpr const char* name = #name_;                                                 \
-    static constexpr std::int64_t code = code_;                                                 \
-    static constexpr bool gpu = gpu_;                                                           \
-    static constexpr bool uniform_bits = uniform_bits_;                                         \
+#define TARN_ENGINE(name_, code_, label, word_bits_, seed_type, gpu_, skip, skip_list, leapfrog, \
+                    uniform_bits_, built)                                                        \
+  template <>                                                                                    \
+  struct engine_row<name_> {                                                                     \
+    static constexpr const char* name = #name_;                                                  \
+    static constexpr std::int64_t code = code_;                                                  \
+    static constexpr int word_bits = word_bits_;                                                 \
+    static constexpr bool gpu = gpu_;                                                            \
+    static constexpr bool device_road = built;                                                   \
+    static constexpr bool uniform_bits = uniform_bits_;                                          \
   };
 #include "engines/engines.def"
 
@@ -34,11 +36,13 @@ enum class device_entry : std::uint8_t { generate, generate_ex };
 template <typename Distr>
 struct distribution_row;
 
-#define TARN_DISTRIBUTION(family, result, method, type, words_, road, built) \
-  template <>                                                                \
-  struct distribution_row<TARN_UNWRAP type> {                                \
-    static constexpr std::uint64_t per_output_words = words_;                \
-    static constexpr device_entry entry = device_entry::road;                \
+#define TARN_DISTRIBUTION(family_, result, method, type, words_, road, built) \
+  template <>                                                                 \
+  struct distribution_row<TARN_UNWRAP type> {                                 \
+    static constexpr const char* family = #family_;                           \
+    static constexpr bool device_road = built;                                \
+    static constexpr std::uint64_t per_output_words = words_;                 \
+    static constexpr device_entry entry = device_entry::road;                 \
   };
 #include "distributions/distributions.def"
 

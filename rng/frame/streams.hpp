@@ -20,10 +20,17 @@ owned_stream new_stream(std::int64_t code, std::uint64_t seed);
 owned_stream new_stream(std::int64_t code, std::int64_t n, const std::uint32_t* seed);
 owned_stream copy_stream(rvx_stream source);
 
+/// The stream code of a member of a set of engines; raises invalid_argument past its end.
+std::int64_t member_code(std::int64_t code, std::uint32_t engine_idx, std::uint32_t members);
+
 /// Move a stream by `words`, or by the number whose 64-bit digits are given, least significant
 /// first; raise computation_error ("skip_ahead").
 void skip_stream(rvx_stream stream, std::uint64_t words);
 void skip_stream(rvx_stream stream, std::int64_t digits, const std::uint64_t* words);
+
+/// Leaves a stream every `stride`-th word from word `idx` on; raises computation_error
+/// ("leapfrog").
+void leapfrog_stream(rvx_stream stream, std::uint64_t idx, std::uint64_t stride);
 
 /// The engine's state record inside the stream's memory.
 inline const void* state_record(rvx_stream stream) {

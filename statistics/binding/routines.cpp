@@ -17,12 +17,14 @@ namespace {
 using namespace tarn::rvx;
 namespace parameters = tarn::statistics::parameters;
 
-// A failure that the checks in front cannot foresee: the method's bits, or a stream that is not in
-// order. Callers may drop the status, so it has to be reported here; a missing entry has been.
+// A failure that the checks in front cannot foresee: the method's bits, numbers behind a pointer,
+// or a stream that is not in order. Callers may drop the status, so it has to be reported here; a
+// missing entry has been.
 int report_failure(const char* name, int status) {
+  constexpr int last_argument = -8;
   if (status >= 0 || status == RVX_STATUS_NO_ENTRY)
     return status;
-  return report(name, status == -1 ? 1 : 2, status);
+  return report(name, status >= last_argument ? -status : 2, status);
 }
 
 // Values that one raw word of the stream's engine takes: words of more than 32 bits take two.
@@ -82,3 +84,15 @@ int routine(const char* name, std::int64_t method, int methods, rvx_stream strea
         });                                                                                        \
   }
 #include "statistics/common/routines.def"
+
+// A rate for each result: the rates move along with the pieces.
+int rvxiRngPoissonV(std::int64_t method, rvx_stream stream, std::int64_t n, std::int32_t* r,
+                    const double* lambda) {
+  static entry<int(int, rvx_stream, int, std::int32_t*, const double*)> library("_rvxiRngPoissonV");
+  return routine(
+      __func__, method, parameters::any_method, stream, n, r,
+      [&] { return parameters::poisson_v(lambda); }, [] { return one_value; },
+      [&](int m, rvx_stream s, int count, std::int32_t* to) {
+        return library(m, s, count, to, lambda + (to - r));
+      });
+}

@@ -55,6 +55,13 @@ typedef void* rvx_stream;
 #define RVX_RNG_METHOD_ACCURACY_FLAG 0x40000000
 #define RVX_RNG_METHOD_UNIFORM_STD 0
 #define RVX_RNG_METHOD_UNIFORM_STD_ACCURATE 0x40000000
+#define RVX_RNG_METHOD_GAUSSIAN_BOXMULLER 0
+#define RVX_RNG_METHOD_GAUSSIAN_BOXMULLER2 1
+#define RVX_RNG_METHOD_GAUSSIAN_ICDF 2
+#define RVX_RNG_METHOD_LOGNORMAL_BOXMULLER2 0
+#define RVX_RNG_METHOD_LOGNORMAL_ICDF 1
+#define RVX_RNG_METHOD_POISSON_PTPE 0
+#define RVX_RNG_METHOD_POISSON_GAUSSIAN_ICDF 1
 
 /* Statuses. Other negative values name a bad argument: -k is the k-th argument. */
 #define RVX_STATUS_OK 0
@@ -145,8 +152,9 @@ RVX_API int rvxLoadStreamF(rvx_stream* stream, const char* name, int length);
  *   n       count of results, 0 or more (-3); 0 does nothing
  *   r       n results (-4)
  * then the distribution's parameters. A call of more than 2^31 - 1 results goes in pieces: when one
- * fails, those before it stand and the stream is behind them. Also -1002 where the engine does not offer the routine,
- * -1005 past the end of a finite sequence, -1004 when an outer source fails, -1001. */
+ * fails, those before it stand and the stream is behind them. Also -1002 where the engine does not
+ * offer the routine, -1005 past the end of a finite sequence, -1004 when an outer source fails,
+ * -1001. */
 
 /* Uniform on [a, b), a < b (-5): the word-to-real rule of the engine, one word for one result. The
  * values b - a and a + b are taken in the type of the results and must be finite. Rounding may
@@ -167,6 +175,97 @@ RVX_API int rvxiRngUniformBits(int64_t method, rvx_stream stream, int64_t n, uin
 RVX_API int rvxiRngUniformBits32(int64_t method, rvx_stream stream, int64_t n, uint32_t* r);
 /* The same with 64 bits: two words for each result, the first one in the low half. */
 RVX_API int rvxiRngUniformBits64(int64_t method, rvx_stream stream, int64_t n, uint64_t* r);
+
+/* Real distributions. Parameters are finite, scales and shapes positive; each refusal gives -k for
+ * the k-th argument. Formulas, words consumed and accuracy: the manual's page of each. */
+
+/* Normal: mean, stddev (-6). Methods RVX_RNG_METHOD_GAUSSIAN_*. */
+RVX_API int rvxsRngGaussian(int64_t method, rvx_stream stream, int64_t n, float* r, float mean,
+                            float stddev);
+RVX_API int rvxdRngGaussian(int64_t method, rvx_stream stream, int64_t n, double* r, double mean,
+                            double stddev);
+/* n vectors of `dimension` (-5) correlated normals, mean + T z with the lower triangular factor T
+ * of the covariance: layout (-6) 0 full, row by row; 1 packed, column by column from the diagonal
+ * on; 2 diagonal. r holds n * dimension numbers. */
+RVX_API int rvxsRngGaussianMV(int64_t method, rvx_stream stream, int64_t n, float* r,
+                              int32_t dimension, int32_t layout, const float* mean,
+                              const float* matrix);
+RVX_API int rvxdRngGaussianMV(int64_t method, rvx_stream stream, int64_t n, double* r,
+                              int32_t dimension, int32_t layout, const double* mean,
+                              const double* matrix);
+/* displ + scale * exp(normal of mean m and deviation s): s (-6), scale (-8). */
+RVX_API int rvxsRngLognormal(int64_t method, rvx_stream stream, int64_t n, float* r, float m,
+                             float s, float displ, float scale);
+RVX_API int rvxdRngLognormal(int64_t method, rvx_stream stream, int64_t n, double* r, double m,
+                             double s, double displ, double scale);
+/* a + beta * standard exponential: beta (-6). */
+RVX_API int rvxsRngExponential(int64_t method, rvx_stream stream, int64_t n, float* r, float a,
+                               float beta);
+RVX_API int rvxdRngExponential(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
+                               double beta);
+/* a + beta * gamma of shape alpha: alpha (-5), beta (-7). */
+RVX_API int rvxsRngGamma(int64_t method, rvx_stream stream, int64_t n, float* r, float alpha,
+                         float a, float beta);
+RVX_API int rvxdRngGamma(int64_t method, rvx_stream stream, int64_t n, double* r, double alpha,
+                         double a, double beta);
+/* a + b * beta of shapes p (-5) and q (-6): b (-8). */
+RVX_API int rvxsRngBeta(int64_t method, rvx_stream stream, int64_t n, float* r, float p, float q,
+                        float a, float b);
+RVX_API int rvxdRngBeta(int64_t method, rvx_stream stream, int64_t n, double* r, double p, double q,
+                        double a, double b);
+/* Chi-square of `degrees` of freedom, 1 or more (-5). */
+RVX_API int rvxsRngChiSquare(int64_t method, rvx_stream stream, int64_t n, float* r,
+                             int32_t degrees);
+RVX_API int rvxdRngChiSquare(int64_t method, rvx_stream stream, int64_t n, double* r,
+                             int32_t degrees);
+/* a + beta * (standard exponential)^(1 / alpha): alpha (-5), beta (-7). */
+RVX_API int rvxsRngWeibull(int64_t method, rvx_stream stream, int64_t n, float* r, float alpha,
+                           float a, float beta);
+RVX_API int rvxdRngWeibull(int64_t method, rvx_stream stream, int64_t n, double* r, double alpha,
+                           double a, double beta);
+/* a + b * sqrt(standard exponential): b (-6). */
+RVX_API int rvxsRngRayleigh(int64_t method, rvx_stream stream, int64_t n, float* r, float a,
+                            float b);
+RVX_API int rvxdRngRayleigh(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
+                            double b);
+/* a + b * ln(standard exponential): b (-6). */
+RVX_API int rvxsRngGumbel(int64_t method, rvx_stream stream, int64_t n, float* r, float a, float b);
+RVX_API int rvxdRngGumbel(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
+                          double b);
+/* Density exp(-|x - a| / b) / (2 b): b (-6). */
+RVX_API int rvxsRngLaplace(int64_t method, rvx_stream stream, int64_t n, float* r, float a,
+                           float b);
+RVX_API int rvxdRngLaplace(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
+                           double b);
+/* a + b * tan(uniform angle): b (-6). */
+RVX_API int rvxsRngCauchy(int64_t method, rvx_stream stream, int64_t n, float* r, float a, float b);
+RVX_API int rvxdRngCauchy(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
+                          double b);
+
+/* Integer distributions. */
+
+/* 1 with probability p, 0 <= p <= 1 (-5). */
+RVX_API int rvxiRngBernoulli(int64_t method, rvx_stream stream, int64_t n, int32_t* r, double p);
+/* Failures before the first success, 0 < p <= 1 (-5). */
+RVX_API int rvxiRngGeometric(int64_t method, rvx_stream stream, int64_t n, int32_t* r, double p);
+/* Successes in ntrial >= 1 (-5) trials, 0 <= p <= 1 (-6). */
+RVX_API int rvxiRngBinomial(int64_t method, rvx_stream stream, int64_t n, int32_t* r,
+                            int32_t ntrial, double p);
+/* Marked ones among s (-6) drawn from l (-5) of which m (-7) are marked. */
+RVX_API int rvxiRngHypergeometric(int64_t method, rvx_stream stream, int64_t n, int32_t* r,
+                                  int32_t l, int32_t s, int32_t m);
+/* Failures before success number a > 0 (-5), a real number, 0 < p <= 1 (-6). */
+RVX_API int rvxiRngNegbinomial(int64_t method, rvx_stream stream, int64_t n, int32_t* r, double a,
+                               double p);
+/* n rows of `categories` >= 1 (-6) counts of ntrial >= 0 (-5) trials of probabilities p (-7), which
+ * sum to 1. r holds n * categories numbers. */
+RVX_API int rvxiRngMultinomial(int64_t method, rvx_stream stream, int64_t n, int32_t* r,
+                               int32_t ntrial, int32_t categories, const double* p);
+/* Poisson of rate lambda > 0 (-5). Methods RVX_RNG_METHOD_POISSON_*. */
+RVX_API int rvxiRngPoisson(int64_t method, rvx_stream stream, int64_t n, int32_t* r, double lambda);
+/* Poisson with a rate of its own for each result: n of them (-5). */
+RVX_API int rvxiRngPoissonV(int64_t method, rvx_stream stream, int64_t n, int32_t* r,
+                            const double* lambda);
 
 #ifdef __cplusplus
 }

@@ -77,13 +77,15 @@ void draw(const word_source& source, std::size_t n, std::size_t words_per_value,
     producer(source, n, out, streaming);
     return;
   }
-  for_pieces(n, piece_words / words_per_value, threads, [&](std::size_t first, std::size_t count) {
-    alignas(16) unsigned char state[max_parallel_state];
-    std::memcpy(state, source.state, source.state_bytes);
-    const std::uint64_t distance = first * words_per_value;
-    source.engine->skip(state, {&distance, 1});
-    producer(word_source{source.engine, state, source.state_bytes}, count, out + first, streaming);
-  });
+  for_pieces(n, std::max<std::size_t>(1, piece_words / words_per_value), threads,
+             [&](std::size_t first, std::size_t count) {
+               alignas(16) unsigned char state[max_parallel_state];
+               std::memcpy(state, source.state, source.state_bytes);
+               const std::uint64_t distance = first * words_per_value;
+               source.engine->skip(state, {&distance, 1});
+               producer(word_source{source.engine, state, source.state_bytes}, count, out + first,
+                        streaming);
+             });
   const std::uint64_t distance = words;
   source.engine->skip(source.state, {&distance, 1});
 }

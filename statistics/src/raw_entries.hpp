@@ -26,6 +26,8 @@ RVX_API int __rvxLoadStreamM(void** stream, const std::uint8_t* mem);
 #define TARN_ROUTINE(name, value, methods, width, parameters, arguments, check) \
   RVX_API int _rvx##name(int method, void* stream, int n, value* r TARN_UNWRAP parameters);
 #include "statistics/common/routines.def"
+RVX_API int _rvxiRngPoissonV(int method, void* stream, int n, std::int32_t* r,
+                             const double* lambda);
 
 // Name of the SIMD target ("AVX3_DL", "AVX3", "AVX2", "SSE4", "SSSE3", "SCALAR") that the latest
 // kernel of this process ran in, or an empty string before the first. For tests and bug reports.

@@ -1,7 +1,9 @@
 # SPDX-License-Identifier: Apache-2.0
 # Fails if LIBRARY exports a name that does not match the regular expression MEANT, or none, or if
 # a text of the list NEEDED stands in no readable name, or one of the list HIDDEN does:
-#   cmake -DNM=nm -DLIBRARY=<file> -DMEANT=<regex> [-DNEEDED=...] [-DHIDDEN=...] -P check_exports.cmake
+#   cmake -DNM=nm -DLIBRARY=<file> -DMEANT=<regex> [-DNEEDED=...] [-DNEEDED_BY=<script>] [-DHIDDEN=...]
+#         -P check_exports.cmake
+# The script sets more needed texts, as the list needed_entries.
 # Names are compared as they stand in the symbol table: the readable name of a template function
 # begins with its return type and would hide whose function it is.
 cmake_minimum_required(VERSION 3.25)
@@ -28,7 +30,10 @@ elseif(count EQUAL 0)
 endif()
 execute_process(COMMAND "${NM}" -D --defined-only -C "${LIBRARY}"
                 OUTPUT_VARIABLE readable COMMAND_ERROR_IS_FATAL ANY)
-foreach(name IN LISTS NEEDED)
+if(NEEDED_BY)
+  include("${NEEDED_BY}")
+endif()
+foreach(name IN LISTS NEEDED needed_entries)
   string(FIND "${readable}" "${name}" at)
   if(at EQUAL -1)
     message(FATAL_ERROR "${LIBRARY} does not export ${name}")

@@ -223,9 +223,12 @@ TEST(frame_on_a_gpu, calls_in_flight_give_consecutive_stretches) {
 TEST(outputs_wider_than_n, need_a_buffer_for_every_value) {
   using rng::detail::check_output;
   using rng::detail::values_per_result;
-  EXPECT_EQ(values_per_result(rng::gaussian_mv<float>(2, {0, 0}, {1, 0, 0, 1})), 2);
-  EXPECT_EQ(values_per_result(rng::multinomial<>(3, {0.2, 0.3, 0.5})), 3);
-  EXPECT_EQ(values_per_result(rng::gamma<float>()), 1);
+  EXPECT_EQ(values_per_result<rng::mcg59>(rng::gaussian_mv<float>(2, {0, 0}, {1, 0, 0, 1})), 2);
+  EXPECT_EQ(values_per_result<rng::mcg59>(rng::multinomial<>(3, {0.2, 0.3, 0.5})), 3);
+  EXPECT_EQ(values_per_result<rng::mcg59>(rng::gamma<float>()), 1);
+  EXPECT_EQ(values_per_result<rng::mcg59>(rng::bits<>()), 2);
+  EXPECT_EQ(values_per_result<rng::mcg31m1>(rng::bits<>()), 1);
+  EXPECT_EQ(values_per_result<rng::mcg59>(rng::uniform_bits<>()), 1);
   const auto refusal = [](std::int64_t n, std::size_t size, std::int64_t values) {
     return message_of<tarn::invalid_argument>([=] { check_output(n, size, values); });
   };
@@ -233,6 +236,63 @@ TEST(outputs_wider_than_n, need_a_buffer_for_every_value) {
   EXPECT_EQ(refusal(5, 14, 3), bad_n);
   EXPECT_EQ(refusal(std::numeric_limits<std::int64_t>::max(), 15, 3), bad_n);
   EXPECT_EQ(refusal(0, 0, 3), "[nothing raised]");
+}
+
+// A buffer is refused unless it holds all values of n results, and then nothing is written.
+template <typename Engine, typename Distr>
+std::string buffer_refusal(const Distr& distr, std::int64_t n, std::size_t size) {
+  using T = typename Distr::result_type;
+  Engine engine(tarn_test::cpu_queue());
+  std::vector<T> values(size, T(3));
+  std::string message;
+  {
+    sycl::buffer<T, 1> buffer(values.data(), sycl::range<1>(size));
+    message = message_of<tarn::exception>([&] { rng::generate(distr, engine, n, buffer); });
+    if (message == "[nothing raised]") {
+      return message;
+    }
+    message = message_of<tarn::invalid_argument>([&] { rng::generate(distr, engine, n, buffer); });
+  }
+  EXPECT_EQ(values, std::vector<T>(size, T(3)));
+  return message;
+}
+
+TEST(frame_on_a_cpu, buffers_hold_every_value_of_a_result) {
+  const rng::multinomial<> rows(9, {0.25, 0.25, 0.5});
+  EXPECT_EQ(buffer_refusal<rng::philox4x32x10>(rows, 5, 15), "[nothing raised]");
+  EXPECT_EQ(buffer_refusal<rng::philox4x32x10>(rows, 5, 14), bad_n);
+  const rng::gaussian_mv<double> vectors(2, {0, 0}, {1, 0, 0, 1});
+  EXPECT_EQ(buffer_refusal<rng::mt19937>(vectors, 5, 9), bad_n);
+  EXPECT_EQ(buffer_refusal<rng::mcg59>(rng::bits<>(), 5, 10), "[nothing raised]");
+  EXPECT_EQ(buffer_refusal<rng::mcg59>(rng::bits<>(), 5, 9), bad_n);
+  EXPECT_EQ(buffer_refusal<rng::mcg31m1>(rng::bits<>(), 5, 5), "[nothing raised]");
+}
+
+// The other checks of a call come first.
+TEST(frame_on_a_cpu, a_rate_for_each_result_is_asked_for) {
+  const std::string message =
+      "kestrel::tarn::rng::poisson_v: invalid argument: lambda size should be equal to n";
+  rng::philox4x32x10 engine(tarn_test::cpu_queue(), 4);
+  const rng::poisson_v<> three({1.0, 2.0, 3.0});
+  std::vector<std::int32_t> values(8, -7);
+  const auto refusal = [&](std::int64_t n, std::int32_t* r) {
+    return message_of<tarn::invalid_argument>([&] { rng::generate(three, engine, n, r); });
+  };
+  EXPECT_EQ(refusal(2, values.data()), message);
+  EXPECT_EQ(refusal(4, values.data()), message);
+  EXPECT_EQ(refusal(0, values.data()), message);
+  EXPECT_EQ(refusal(-1, values.data()), bad_n);
+  EXPECT_EQ(refusal(4, nullptr), bad_r);
+  EXPECT_EQ(buffer_refusal<rng::sobol>(three, 4, 8), message);
+  EXPECT_EQ(buffer_refusal<rng::sobol>(three, 4, 3), bad_n);
+  EXPECT_EQ(values, std::vector<std::int32_t>(8, -7));
+  rng::philox4x32x10 untouched(tarn_test::cpu_queue(), 4);
+  EXPECT_EQ(draw(rng::bits<>(), engine, 6), draw(rng::bits<>(), untouched, 6));
+  engine.get_queue() = tarn_test::accelerator_queue();
+  EXPECT_NE(message_of<tarn::unsupported_device>([&] {
+              rng::generate(three, engine, 4, values.data());
+            }).find("generate: unsupported device"),
+            std::string::npos);
 }
 
 // Six engines have no words for equidistributed bits.

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The thirteen engines. A constructor takes a queue and a seed; it raises unsupported_device on a
-// device without a road for the engine and computation_error when the stream cannot be made.
+// device without a road for the engine, unimplemented on a GPU whose road is still missing, and
+// computation_error when the stream cannot be made.
 #pragma once
 
 #include <cstdint>
@@ -185,6 +186,7 @@ class TARN_EXPORT sobol : public detail::engine_base<sobol> {
   static constexpr std::uint32_t default_dimensions_number = 1;
 
   explicit sobol(sycl::queue queue_, std::uint32_t dimensions = default_dimensions_number);
+  /// 32 direction words for each dimension. Puts a header of three words in front of them.
   sobol(sycl::queue queue_, std::vector<std::uint32_t>& direction_numbers);
 
  private:
@@ -199,7 +201,9 @@ class TARN_EXPORT niederreiter : public detail::engine_base<niederreiter> {
   static constexpr std::uint32_t default_dimensions_number = 1;
 
   explicit niederreiter(sycl::queue queue_, std::uint32_t dimensions = default_dimensions_number);
-  niederreiter(sycl::queue queue_, std::vector<std::uint32_t>& direction_numbers);
+  /// Bit i of a polynomial is the coefficient of t^i. Puts a header of three words in front of
+  /// them.
+  niederreiter(sycl::queue queue_, std::vector<std::uint32_t>& irreducible_polynomials);
 
  private:
   void skip_ahead(std::uint64_t num_to_skip);

@@ -1,0 +1,248 @@
+// SPDX-License-Identifier: Apache-2.0
+// Routines of the host statistics library on philox4x32x10 and one thread, 4 million values, beside
+// what a user would take instead, in one run; short calls; and what a second thread adds. Prints
+// the quotients of the medians at the end.
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <functional>
+#include <string>
+#include <vector>
+
+#include <benchmark/benchmark.h>
+
+#include "distribution_peers.hpp"
+#include "ratios.hpp"
+#include "tarn_rvx.h"
+#include "tarn_serv.h"
+
+namespace {
+
+constexpr std::int64_t count = 4'000'000;
+constexpr std::int64_t short_count = 16;
+constexpr int repetitions = 9;
+
+rvx_stream stream = nullptr;
+
+void check(int status) {
+  if (status != 0) {
+    std::fprintf(stderr, "a routine failed with status %d\n", status);
+    std::exit(1);
+  }
+}
+
+// A routine with its parameters: draws n values.
+template <class Value>
+struct routine {
+  const char* name;
+  int (*draw)(std::int64_t n, Value* r);
+  bool fixed_words;  // shared out among threads
+};
+
+const std::vector<routine<float>> float_routines = {
+    {"uniform_float",
+     [](std::int64_t n, float* r) { return rvxsRngUniform(0, stream, n, r, 0, 1); }, true},
+    {"gaussian_float_icdf",
+     [](std::int64_t n, float* r) {
+       return rvxsRngGaussian(RVX_RNG_METHOD_GAUSSIAN_ICDF, stream, n, r, 0, 1);
+     },
+     true},
+    {"gaussian_float_box_muller2",
+     [](std::int64_t n, float* r) {
+       return rvxsRngGaussian(RVX_RNG_METHOD_GAUSSIAN_BOXMULLER2, stream, n, r, 0, 1);
+     },
+     true},
+    {"exponential",
+     [](std::int64_t n, float* r) { return rvxsRngExponential(0, stream, n, r, 0, 1); }, true},
+    {"rayleigh", [](std::int64_t n, float* r) { return rvxsRngRayleigh(0, stream, n, r, 0, 1); },
+     true},
+    {"weibull",
+     [](std::int64_t n, float* r) { return rvxsRngWeibull(0, stream, n, r, 1.7f, 0, 1); }, true},
+    {"gumbel", [](std::int64_t n, float* r) { return rvxsRngGumbel(0, stream, n, r, 0, 1); }, true},
+    {"laplace", [](std::int64_t n, float* r) { return rvxsRngLaplace(0, stream, n, r, 0, 1); },
+     true},
+    {"cauchy", [](std::int64_t n, float* r) { return rvxsRngCauchy(0, stream, n, r, 0, 1); }, true},
+};
+const std::vector<routine<double>> double_routines = {
+    {"uniform_double",
+     [](std::int64_t n, double* r) { return rvxdRngUniform(0, stream, n, r, 0, 1); }, true},
+    {"gaussian_double_icdf",
+     [](std::int64_t n, double* r) {
+       return rvxdRngGaussian(RVX_RNG_METHOD_GAUSSIAN_ICDF, stream, n, r, 0, 1);
+     },
+     true},
+    {"gaussian_double_box_muller2",
+     [](std::int64_t n, double* r) {
+       return rvxdRngGaussian(RVX_RNG_METHOD_GAUSSIAN_BOXMULLER2, stream, n, r, 0, 1);
+     },
+     true},
+    {"lognormal_double",
+     [](std::int64_t n, double* r) {
+       return rvxdRngLognormal(RVX_RNG_METHOD_LOGNORMAL_ICDF, stream, n, r, 0, 1, 0, 1);
+     },
+     true},
+    {"gamma", [](std::int64_t n, double* r) { return rvxdRngGamma(0, stream, n, r, 2.5, 0, 1); },
+     false},
+    {"beta", [](std::int64_t n, double* r) { return rvxdRngBeta(0, stream, n, r, 2.5, 1.5, 0, 1); },
+     false},
+};
+const std::vector<routine<std::int32_t>> integer_routines = {
+    {"poisson_icdf_10",
+     [](std::int64_t n, std::int32_t* r) {
+       return rvxiRngPoisson(RVX_RNG_METHOD_POISSON_GAUSSIAN_ICDF, stream, n, r, 10);
+     },
+     true},
+    {"poisson_icdf_500",
+     [](std::int64_t n, std::int32_t* r) {
+       return rvxiRngPoisson(RVX_RNG_METHOD_POISSON_GAUSSIAN_ICDF, stream, n, r, 500);
+     },
+     true},
+    {"poisson_ptpe_10",
+     [](std::int64_t n, std::int32_t* r) {
+       return rvxiRngPoisson(RVX_RNG_METHOD_POISSON_PTPE, stream, n, r, 10);
+     },
+     false},
+    {"poisson_ptpe_500",
+     [](std::int64_t n, std::int32_t* r) {
+       return rvxiRngPoisson(RVX_RNG_METHOD_POISSON_PTPE, stream, n, r, 500);
+     },
+     false},
+    {"binomial",
+     [](std::int64_t n, std::int32_t* r) { return rvxiRngBinomial(0, stream, n, r, 100, 0.4); },
+     false},
+    {"hypergeometric",
+     [](std::int64_t n, std::int32_t* r) {
+       return rvxiRngHypergeometric(0, stream, n, r, 100, 30, 50);
+     },
+     false},
+    {"negative_binomial",
+     [](std::int64_t n, std::int32_t* r) { return rvxiRngNegbinomial(0, stream, n, r, 10, 0.4); },
+     false},
+};
+
+// What each routine is asked to reach: a quotient over the fastest of the peers.
+struct goal {
+  const char* routine;
+  double ratio;
+  std::vector<std::string> peers;
+};
+const std::vector<goal> goals = {
+    {"uniform_float", 2.5, {"random123/uniform_float"}},
+    {"uniform_double", 2, {"random123/uniform_double"}},
+    {"gaussian_float_icdf", 5, {"boost/normal_float"}},
+    {"gaussian_float_box_muller2", 5, {"boost/normal_float"}},
+    {"gaussian_double_icdf", 4, {"boost/normal_double"}},
+    {"gaussian_double_box_muller2", 4, {"boost/normal_double"}},
+    {"exponential", 4, {"boost/exponential_float"}},
+    {"rayleigh", 4, {"boost/exponential_float"}},
+    {"weibull", 4, {"boost/exponential_float"}},
+    {"gumbel", 4, {"boost/exponential_float"}},
+    {"laplace", 4, {"boost/exponential_float"}},
+    {"cauchy", 4, {"boost/exponential_float"}},
+    {"lognormal_double", 8, {"numpy/lognormal"}},
+    {"gamma", 4, {"std/gamma", "gsl/gamma", "numpy/gamma"}},
+    {"beta", 5, {"gsl/beta", "numpy/beta"}},
+    {"poisson_icdf_10",
+     15,
+     {"std/poisson_10", "boost/poisson_10", "gsl/poisson_10", "numpy/poisson_10"}},
+    {"poisson_icdf_500",
+     8,
+     {"std/poisson_500", "boost/poisson_500", "gsl/poisson_500", "numpy/poisson_500"}},
+    {"poisson_ptpe_10",
+     8,
+     {"std/poisson_10", "boost/poisson_10", "gsl/poisson_10", "numpy/poisson_10"}},
+    {"poisson_ptpe_500",
+     4,
+     {"std/poisson_500", "boost/poisson_500", "gsl/poisson_500", "numpy/poisson_500"}},
+    {"binomial", 6, {"boost/binomial", "numpy/binomial"}},
+    {"hypergeometric", 8, {"numpy/hypergeometric"}},
+    {"negative_binomial", 10, {"numpy/negative_binomial"}},
+};
+constexpr double two_threads = 1.7;
+constexpr double short_call = 300;  // nanoseconds
+
+benchmark::internal::Benchmark* add(const std::string& name,
+                                    const std::function<void(benchmark::State&)>& run) {
+  return benchmark::RegisterBenchmark(name.c_str(), run)
+      ->UseRealTime()
+      ->Repetitions(repetitions)
+      ->ReportAggregatesOnly();
+}
+
+// draw(n, values) in a loop, on memory that was touched before.
+template <class Value>
+void add_draw(const std::string& name, std::int64_t n, int threads,
+              const std::function<void(std::int64_t, Value*)>& draw) {
+  add(name,
+      [n, threads, draw](benchmark::State& state) {
+        tarn_serv_set_max_threads(threads);
+        std::vector<Value> values(static_cast<std::size_t>(n));
+        draw(n, values.data());
+        for (auto _ : state) {
+          draw(n, values.data());
+          benchmark::ClobberMemory();
+        }
+        state.SetItemsProcessed(state.iterations() * n);
+      })
+      ->MinTime(n == count ? 0.1 : 0.02)
+      ->Unit(n == count ? benchmark::kMillisecond : benchmark::kNanosecond);
+}
+
+template <class Value, class Peer>
+void add_all(const std::vector<routine<Value>>& routines, const std::vector<Peer>& others) {
+  for (const routine<Value>& r : routines) {
+    const auto draw = [r](std::int64_t n, Value* to) { check(r.draw(n, to)); };
+    const std::string name = r.name;
+    add_draw<Value>(name, count, 1, draw);
+    if (r.fixed_words) {
+      add_draw<Value>(name + "/2threads", count, 2, draw);
+      add_draw<Value>(name + "/short", short_count, 1, draw);
+    }
+  }
+  for (const Peer& p : others)
+    add_draw<Value>(p.name, count, 1,
+                    [p](std::int64_t n, Value* to) { p.fill(static_cast<std::size_t>(n), to); });
+}
+
+std::string fastest(const ratio_reporter& reporter, const std::vector<std::string>& names) {
+  return *std::max_element(names.begin(), names.end(), [&](const auto& a, const auto& b) {
+    return reporter.rate(a) < reporter.rate(b);
+  });
+}
+
+template <class Value>
+void print_threads_and_short_calls(const ratio_reporter& reporter,
+                                   const std::vector<routine<Value>>& routines) {
+  for (const routine<Value>& r : routines) {
+    if (!r.fixed_words)
+      continue;
+    const std::string name = r.name;
+    reporter.print_ratio(name + "/2threads", name, two_threads);
+    reporter.print_time(name + "/short", short_call);
+  }
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  if (!initialize(argc, argv))
+    return 1;
+  check(rvxNewStream(&stream, RVX_BRNG_PHILOX4X32X10, 1));
+  add_all(float_routines, peers::float_peers);
+  add_all(double_routines, peers::double_peers);
+  add_all(integer_routines, peers::integer_peers);
+
+  ratio_reporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  for (const peers::numpy_rate& rate : peers::numpy_rates())
+    reporter.set_rate(rate.name, rate.rate);
+  std::printf("\nQuotients of the median rates (values per second, one thread)\n");
+  for (const goal& wanted : goals)
+    reporter.print_ratio(wanted.routine, fastest(reporter, wanted.peers), wanted.ratio);
+  std::printf("\nA second thread, and calls of %d values\n", static_cast<int>(short_count));
+  print_threads_and_short_calls(reporter, float_routines);
+  print_threads_and_short_calls(reporter, double_routines);
+  print_threads_and_short_calls(reporter, integer_routines);
+  check(rvxDeleteStream(&stream));
+  return 0;
+}

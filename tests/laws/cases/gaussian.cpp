@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+// Three methods over places and scales, small and large against each other and by themselves.
+#include "../reference.hpp"
+#include "../specimen.hpp"
+
+namespace laws {
+
+namespace {
+
+template <class Real>
+void add(std::vector<specimen>& all) {
+  const double sets[][2] = {{0, 1},   {1, 1},    {-2, 0.5},  {10, 30},  {0, 1e-20}, {0, 1e20},
+                            {-1, 10}, {2, 0.25}, {1e6, 1e5}, {-0.1, 3}, {7, 1},     {-1e-9, 1e-9}};
+  for (const auto& set : sets) {
+    const auto mean = static_cast<Real>(set[0]), stddev = static_cast<Real>(set[1]);
+    for (const std::int64_t method :
+         {RVX_RNG_METHOD_GAUSSIAN_BOXMULLER, RVX_RNG_METHOD_GAUSSIAN_BOXMULLER2,
+          RVX_RNG_METHOD_GAUSSIAN_ICDF}) {
+      all.push_back(routine(form_name<Real>("RngGaussian"),
+                            form<Real>(rvxsRngGaussian, rvxdRngGaussian), method,
+                            gaussian(mean, stddev), resolution_of<Real>(mean), mean, stddev));
+      all.back().paired = method == RVX_RNG_METHOD_GAUSSIAN_BOXMULLER2;
+    }
+  }
+}
+
+}  // namespace
+
+std::vector<specimen> gaussian_cases() {
+  std::vector<specimen> all;
+  add<float>(all);
+  add<double>(all);
+  return all;
+}
+
+}  // namespace laws

@@ -1,0 +1,141 @@
+// SPDX-License-Identifier: Apache-2.0
+// Which device takes which engine and which distribution, by the rows of the lists, and what is
+// said to the others.
+#include <cstdint>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include <kestrel/tarn/rng.hpp>
+
+#include <gtest/gtest.h>
+
+#include "every_engine.hpp"
+#include "frame/rows.hpp"
+#include "message.hpp"
+#include "queues.hpp"
+#include "routine_samples.hpp"
+
+namespace {
+
+namespace tarn = kestrel::tarn;
+namespace rng = kestrel::tarn::rng;
+using namespace tarn_test;
+
+std::string unsupported(const std::string& function, const sycl::queue& queue) {
+  return "kestrel::tarn::rng::" + function +
+         ": unsupported device: " + queue.get_device().get_info<sycl::info::device::name>();
+}
+
+TEST(devices, that_are_neither_cpu_nor_gpu_have_no_engine) {
+  const sycl::queue queue = accelerator_queue();
+  for_every_engine([&](const auto& on) {
+    EXPECT_EQ(message_of<tarn::unsupported_device>([&] { on.make(queue); }),
+              unsupported(on.name, queue));
+  });
+}
+
+TEST(devices, of_the_gpu_kind_have_the_engines_with_a_device_road) {
+  const sycl::queue queue = gpu_queue();
+  for_every_engine([&](const auto& on) {
+    if (on.device_road) {
+      EXPECT_EQ(message_of<tarn::exception>([&] { on.make(queue); }), "[nothing raised]");
+    } else if (on.gpu) {
+      EXPECT_EQ(message_of<tarn::unimplemented>([&] { on.make(queue); }),
+                std::string("kestrel::tarn::rng::") + on.name +
+                    ": unimplemented functionality: this engine on a GPU");
+    } else {
+      EXPECT_EQ(message_of<tarn::unsupported_device>([&] { on.make(queue); }),
+                unsupported(on.name, queue));
+    }
+  });
+}
+
+TEST(devices, are_asked_before_the_seed) {
+  const sycl::queue queue = accelerator_queue();
+  EXPECT_EQ(message_of<tarn::unsupported_device>([&] { rng::mt2203(queue, 1, 6024); }),
+            unsupported("mt2203", queue));
+  EXPECT_EQ(message_of<tarn::unsupported_device>([&] {
+              rng::wichmann_hill(queue, {1, 2}, 273);
+            }),
+            unsupported("wichmann_hill", queue));
+  std::vector<std::uint32_t> table(32, 1);
+  EXPECT_EQ(message_of<tarn::unsupported_device>([&] { rng::sobol(queue, table); }),
+            unsupported("sobol", queue));
+  EXPECT_EQ(table, std::vector<std::uint32_t>(32, 1));
+}
+
+TEST(devices, that_are_no_gpus_have_no_modes_of_mrg32k3a) {
+  const auto refusals = [](const sycl::queue& queue, auto raised) {
+    using expected = decltype(raised);
+    const std::initializer_list<std::uint32_t> list = {1, 2};
+    const rng::mrg32k3a_mode::optimal optimal;
+    const rng::mrg32k3a_mode::custom custom(64);
+    return std::vector<std::string>{
+        message_of<expected>([&] { rng::mrg32k3a(queue, 1, optimal); }),
+        message_of<expected>([&] { rng::mrg32k3a(queue, 1, custom); }),
+        message_of<expected>([&] { rng::mrg32k3a(queue, list, optimal); }),
+        message_of<expected>([&] { rng::mrg32k3a(queue, list, custom); })};
+  };
+  for (const sycl::queue& queue : {cpu_queue(), accelerator_queue()}) {
+    EXPECT_EQ(refusals(queue, tarn::unsupported_device("", "", queue.get_device())),
+              std::vector<std::string>(4, unsupported("mrg32k3a", queue)));
+  }
+  EXPECT_EQ(
+      refusals(gpu_queue(), tarn::unimplemented("", "", "")),
+      std::vector<std::string>(
+          4, "kestrel::tarn::rng::mrg32k3a: unimplemented functionality: sub-sequence modes"));
+}
+
+// An engine can come to stand on a queue that its constructor would have refused.
+TEST(devices, are_asked_again_by_generate) {
+  for_every_engine([&](const auto& on) {
+    std::uint32_t value = 9;
+    const auto refusal = [&](const sycl::queue& queue, auto raised) {
+      auto engine = on.make(cpu_queue());
+      engine.get_queue() = queue;
+      return message_of<decltype(raised)>([&] { rng::generate(rng::bits<>(), engine, 1, &value); });
+    };
+    const sycl::queue other = accelerator_queue();
+    EXPECT_EQ(refusal(other, tarn::unsupported_device("", "", other.get_device())),
+              unsupported("generate", other));
+    const sycl::queue gpu = gpu_queue();
+    if (!on.gpu) {
+      EXPECT_EQ(refusal(gpu, tarn::unsupported_device("", "", gpu.get_device())),
+                unsupported("generate", gpu));
+    } else if (!on.device_road) {
+      EXPECT_EQ(refusal(gpu, tarn::unimplemented("", "", "")),
+                std::string("kestrel::tarn::rng::generate: unimplemented functionality: ") +
+                    on.name + " engine on a GPU");
+    }
+    EXPECT_EQ(value, 9u);
+  });
+}
+
+template <typename Distr>
+void expect_device_road(const std::string& family, bool device_road) {
+  constexpr std::int64_t n = 4;
+  rng::philox4x32x10 engine(gpu_queue());
+  std::vector<typename Distr::result_type> values(16);
+  sycl::buffer<typename Distr::result_type, 1> buffer{sycl::range<1>(16)};
+  const std::string expected =
+      device_road ? "[nothing raised]"
+                  : "kestrel::tarn::rng::generate: unimplemented functionality: " + family +
+                        " distribution on a GPU";
+  EXPECT_EQ(message_of<tarn::unimplemented>(
+                [&] { rng::generate(sample<Distr>::make(n), engine, n, values.data()).wait(); }),
+            expected);
+  EXPECT_EQ(message_of<tarn::unimplemented>(
+                [&] { rng::generate(sample<Distr>::make(n), engine, n, buffer); }),
+            expected);
+}
+
+TEST(devices, of_the_gpu_kind_have_the_distributions_with_a_device_road) {
+  using namespace rng;
+  using rng::gamma;  // <math.h> has one as well
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
+  expect_device_road<TARN_UNWRAP type>(#family, built == 1);
+#include "distributions/distributions.def"
+}
+
+}  // namespace
