@@ -5,6 +5,7 @@
 #include <cstdint>
 
 #include "distributions/candidates.hpp"
+#include "simd/compressed-inl.hpp"
 #include "simd/near_one-inl.hpp"
 #include "simd/target.hpp"
 
@@ -36,20 +37,6 @@ HWY_INLINE reals inner(reals u) {
   const auto greatest = constant(1 - 0x1p-53);
   const auto raised = hn::IfThenElse(hn::Lt(u, least), least, u);
   return hn::IfThenElse(hn::Gt(raised, greatest), greatest, raised);
-}
-
-// The lanes of the mask first, in their order. Highway 1.0 looks the order of eight lanes up in a
-// table that it copies to the stack each time.
-template <class D>
-HWY_INLINE hn::Vec<D> compressed(D, hn::Vec<D> v, hn::Mask<D> mask) {
-#if HWY_TARGET == HWY_AVX3
-  if constexpr (hwy::IsFloat<hn::TFromD<D>>())
-    return hn::Vec<D>{_mm512_maskz_compress_pd(mask.raw, v.raw)};
-  else
-    return hn::Vec<D>{_mm512_maskz_compress_epi64(mask.raw, v.raw)};
-#else
-  return hn::Compress(v, mask);
-#endif
 }
 
 HWY_INLINE reals or_rejected(real_mask accepted, reals value) {

@@ -6,6 +6,7 @@
 
 #include "distributions/hat.hpp"
 #include "distributions/log_ratio-inl.hpp"
+#include "simd/compressed-inl.hpp"
 #include "simd/target.hpp"
 
 #if defined(TARN_HAT_INL_HPP) == defined(HWY_TARGET_TOGGLE)
@@ -18,16 +19,6 @@
 HWY_BEFORE_NAMESPACE();
 namespace tarn::statistics::HWY_NAMESPACE {
 
-// The lanes of the mask in front, the others behind or lost.
-HWY_INLINE double_vector compressed(double_vector x, truths mask) {
-#if HWY_TARGET == HWY_AVX3
-  // The instruction, since GCC copies the table of Highway's form onto the stack at each use.
-  return double_vector{_mm512_maskz_compress_pd(mask.raw, x.raw)};
-#else
-  return hn::Compress(x, mask);
-#endif
-}
-
 // A column of candidates.
 struct column {
   HWY_ALIGN double row[candidate_room];
@@ -35,7 +26,7 @@ struct column {
   HWY_INLINE double_vector at(std::size_t i) const { return hn::LoadU(doubles(), row + i); }
   // Appends the lanes of the mask behind the first n.
   HWY_INLINE void append(std::size_t n, double_vector x, truths mask) {
-    hn::StoreU(compressed(x, mask), doubles(), row + n);
+    hn::StoreU(compressed(doubles(), x, mask), doubles(), row + n);
   }
 };
 
@@ -143,7 +134,7 @@ HWY_INLINE std::size_t accept(const Setup& setup, const double* uniforms, std::s
     const truths kept = hn::And(hn::Ge(y, hn::Zero(d)), hn::FirstN(d, count - i));
     const auto x = hn::Add(every(setup.result.origin), hn::Mul(every(setup.result.sign), y));
     const auto bounded = hn::IfThenElse(hn::Lt(x, every(0x7FFFFFFF)), x, every(0x7FFFFFFF));
-    hn::StoreU(hn::DemoteTo(d32, compressed(bounded, kept)), d32, values + accepted);
+    hn::StoreU(hn::DemoteTo(d32, compressed(d, bounded, kept)), d32, values + accepted);
     accepted += hn::CountTrue(d, kept);
   }
   std::copy_n(values, accepted, out);

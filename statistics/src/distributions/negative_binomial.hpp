@@ -24,8 +24,8 @@ struct negative_binomial_law {
   negative_binomial_law(double shape, double probability);
 
   bool zero() const { return q == 0; }
-  // The least representable failure count that is too large is practically certain to be exceeded:
-  // the others are less likely than 2^-68 together.
+  // Whether results are practically certain to lie beyond the greatest representable count: all
+  // others together are less likely than 2^-68.
   bool saturated() const;
   bool by_table() const { return v < 100 && p >= 0x1p-6; }
 

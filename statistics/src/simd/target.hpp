@@ -22,6 +22,10 @@ const char* latest_simd_target();
 
 }  // namespace tarn::statistics
 
-// Calls the chosen target's variant of a function given to HWY_EXPORT in this source.
-#define TARN_SIMD_CALL(function) \
-  (HWY_DISPATCH_TABLE(function)[::tarn::statistics::simd_row(HWY_TARGETS)])
+// Calls the chosen target's variant of a function given to HWY_EXPORT in this source. The row is
+// found at the first call of each place.
+#define TARN_SIMD_CALL(function)                                              \
+  (HWY_DISPATCH_TABLE(function)[([] {                                         \
+    static const std::size_t row = ::tarn::statistics::simd_row(HWY_TARGETS); \
+    return row;                                                               \
+  }())])

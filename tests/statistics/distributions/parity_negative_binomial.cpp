@@ -107,8 +107,8 @@ counts::propose power(double a, double p) {
 TEST_F(negative_binomial, small_laws_are_inverted) {
   // A mode below 100, and p of at least 1/64.
   constexpr double laws[][2] = {
-      {10, 0.4},     {1, 0.51},        {0.5, 0.5},        {1e-300, 0.5}, {0.01, 0.02},
-      {2.5, 0.9},    {100.9, 0.5},     {25.9, 0.2},       {899, 0.9},    {0.25, 0.015625},
+      {10, 0.4},      {1, 0.51},        {0.5, 0.5},        {1e-300, 0.5}, {0.01, 0.02},
+      {2.5, 0.9},     {100.9, 0.5},     {25.9, 0.2},       {899, 0.9},    {0.25, 0.015625},
       {1e6, 0.99991}, {2.58, 0.015625}, {7.5, 1 - 0x1p-53}};
   for (const auto& l : laws) {
     SCOPED_TRACE(testing::Message() << l[0] << ", " << l[1]);
