@@ -11,6 +11,7 @@
 #include "distributions/hat.hpp"
 #include "distributions/log_ratio.hpp"
 #include "distributions/tabulated_law.hpp"
+#include "distributions/tent.hpp"
 
 namespace tarn::statistics {
 
@@ -28,17 +29,13 @@ struct binomial_law {
 // Inversion for laws with by_table().
 tabulated_values invert_binomial(const binomial_law& law, std::size_t uses);
 
-// BTPE, with the names of the paper. The hat is a triangle, which lies below the law and is
-// accepted at sight, the two halves of a parallelogram around it, and two exponential tails.
-struct btpe {
+// BTPE, with the names of the paper.
+struct btpe : tent {
   btpe(const binomial_law& law, std::size_t uses);
 
   std::size_t attempt(const double* uniforms, std::size_t count, std::int32_t* out) const;
 
   double n, npq;
-  double p1, p2, p3, p4;  // areas, summed: triangle, parallelogram, left tail, right tail
-  double xm, xl, xr;
-  double c, lambda_l, lambda_r;
   near_ratios near;
   log_ratio ratio;
   image result;
