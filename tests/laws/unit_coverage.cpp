@@ -7,6 +7,7 @@
 
 #include <gtest/gtest.h>
 
+#include "edge_cases.hpp"
 #include "specimen.hpp"
 
 namespace {
@@ -54,6 +55,16 @@ TEST(coverage, every_routine_and_method_has_cases) {
 #include "statistics/common/routines.def"
   expect_covered("iRngPoissonV", {0}, true);
   EXPECT_EQ(covered().size(), routines + 1) << "cases of routines that the list has not";
+}
+
+TEST(coverage, every_routine_with_parameters_has_edge_cases) {
+  std::set<std::string> at_edges, with_parameters;
+  for (const laws::specimen& s : laws::edge_cases())
+    at_edges.insert(s.routine);
+  for (const laws::specimen& s : laws::every_case())
+    if (!s.parameters.empty())
+      with_parameters.insert(s.routine);
+  EXPECT_EQ(at_edges, with_parameters);
 }
 
 }  // namespace

@@ -40,8 +40,9 @@ btpe::btpe(const binomial_law& law, std::size_t uses)
   p4 = p3 + c / lambda_r;
 
   ratio.reference = m;
-  // ln((n - m) r / (m q)), whose argument is next to 1
-  ratio.slope = std::log1p((n * r - m) / (m * q));
+  // ln((n - m) r / (m q)), whose argument is next to 1. The error of n r - m counts as often as
+  // there are steps from the mode.
+  ratio.slope = std::log1p(std::fma(n, r, -m) / (m * q));
   ratio.shift = 0;
   ratio.add(-1, 1, m);
   ratio.add(-1, -1, n - m);

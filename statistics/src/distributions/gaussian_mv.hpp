@@ -27,8 +27,9 @@ class triangular_factor {
   const Real* data_;
 };
 
-// x = (T[r][0] z[0] + T[r][1] z[1] + ... + T[r][r] z[r]) + mean[r], each product and sum rounded,
-// for n vectors in place.
+// x = (T[r][0] z[0] + T[r][1] z[1] + ... + T[r][r] z[r]) + mean[r], each product and sum rounded as
+// if it had no greatest exponent, for n vectors in place. Results beyond the greatest finite number
+// are that number.
 void transform_vectors(const triangular_factor<float>& factor, const float* mean,
                        std::size_t dimension, std::size_t n, float* vectors);
 void transform_vectors(const triangular_factor<double>& factor, const double* mean,

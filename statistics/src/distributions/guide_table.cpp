@@ -24,7 +24,9 @@ std::size_t choose_cells(std::size_t values, std::size_t uses) {
 }  // namespace
 
 guide_table::guide_table(std::vector<double> cdf, std::size_t uses)
-    : cdf_(std::move(cdf)), guides_(choose_cells(cdf_.size(), uses)) {
+    : cdf_(std::move(cdf)), guides_(uses < worth ? 0 : choose_cells(cdf_.size(), uses)) {
+  if (guides_.empty())
+    return;
   const double width = 1 / static_cast<double>(guides_.size());
   std::int32_t value = 0;
   for (std::size_t cell = 0; cell < guides_.size(); ++cell) {
@@ -35,6 +37,10 @@ guide_table::guide_table(std::vector<double> cdf, std::size_t uses)
 }
 
 void guide_table::look_up(const double* u, std::size_t n, std::int32_t* out) const {
+  if (guides_.empty()) {
+    count_steps(u, n, cdf_.data(), out);
+    return;
+  }
   while (n != 0) {
     const std::size_t count = std::min(n, block_words);
     if (look_up_guides(u, count, 0, guides_, out))

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Gathering guides for vectors of numbers.
+// Vectors of numbers climb the steps of a cdf, or gather guides.
 #undef HWY_TARGET_INCLUDE
 #define HWY_TARGET_INCLUDE "distributions/guide_table_simd.cpp"
 #include <algorithm>
@@ -8,12 +8,30 @@
 #include <hwy/highway.h>
 
 #include "distributions/guide_table.hpp"
+#include "simd/map-inl.hpp"
 #include "simd/target.hpp"
 
 HWY_BEFORE_NAMESPACE();
 namespace tarn::statistics::HWY_NAMESPACE {
 
 namespace hn = hwy::HWY_NAMESPACE;
+
+void count_steps(const double* u, std::size_t n, const double* cdf, std::int32_t* out) {
+  const hn::ScalableTag<double> d;
+  const hn::Rebind<std::int32_t, decltype(d)> di;
+  const auto greatest = hn::Set(d, guide_table::greatest);
+  const auto one = hn::Set(d, 1.0);
+  map_all(di, u, n, false, out, [&](auto x) HWY_ATTR {
+    const auto number = hn::IfThenElse(hn::Lt(x, greatest), x, greatest);
+    auto count = hn::Zero(d);
+    for (const double* step = cdf;; ++step) {
+      const auto reached = hn::Ge(number, hn::Set(d, *step));
+      if (hn::AllFalse(d, reached))
+        return hn::DemoteTo(di, count);
+      count = hn::Add(count, hn::IfThenElseZero(reached, one));
+    }
+  });
+}
 
 bool look_up_guides(const double* HWY_RESTRICT u, std::size_t n, double lo,
                     const std::vector<std::int32_t>& guides, std::int32_t* HWY_RESTRICT codes) {
@@ -49,7 +67,12 @@ HWY_AFTER_NAMESPACE();
 #if HWY_ONCE
 namespace tarn::statistics {
 
+HWY_EXPORT(count_steps);
 HWY_EXPORT(look_up_guides);
+
+void count_steps(const double* u, std::size_t n, const double* cdf, std::int32_t* out) {
+  TARN_SIMD_CALL(count_steps)(u, n, cdf, out);
+}
 
 bool look_up_guides(const double* u, std::size_t n, double lo,
                     const std::vector<std::int32_t>& guides, std::int32_t* codes) {

@@ -67,12 +67,11 @@ HWY_INLINE double_vector factorial_remainder(double_vector x) {
   return hn::IfThenElse(small, of_small, large_remainder(z));
 }
 
-// x ln(x / c) + c - x for x >= 0, c > 0. Near c by the series of ln(x / c) = 2 artanh v with
-// v = (x - c) / (x + c), |v| < 1/10, whose next term is below 2^-60 of the first.
-HWY_INLINE double_vector deviance(double_vector x, double_vector c) {
+// x ln(x / c) + c - x for x >= 0, c > 0, difference = x - c. Near c by the series of ln(x / c) =
+// 2 artanh v with v = (x - c) / (x + c), |v| < 1/10, whose next term is below 2^-60 of the first.
+HWY_INLINE double_vector deviance(double_vector x, double_vector c, double_vector difference) {
   constexpr double series[] = {1.0 / 3,  1.0 / 5,  1.0 / 7,  1.0 / 9,
                                1.0 / 11, 1.0 / 13, 1.0 / 15, 1.0 / 17};
-  const auto difference = hn::Sub(x, c);
   const auto v = hn::Div(difference, hn::Add(x, c));
   const auto v2 = hn::Mul(v, v);
   const auto cubic = hn::Mul(hn::Mul(hn::Add(x, x), hn::Mul(v, v2)), polynomial(v2, series));
@@ -81,6 +80,26 @@ HWY_INLINE double_vector deviance(double_vector x, double_vector c) {
   if (hn::AllTrue(doubles(), is_near))
     return near;
   return hn::IfThenElse(is_near, near, hn::Sub(x_log(x, c), difference));
+}
+
+// The deviance of y + gap from m + gap less the one of y from m = y - k, for y >= 0, m > 0: what
+// the two lose against each other would be about y 2^-53. With c = m + gap and
+// pull = gap k / c, the difference of the two is
+//
+//   gap (ln(1 + k / c) - k / c) + y (ln(1 - pull / y) + pull / y),
+//
+// two deviances again, both at most 0.
+HWY_INLINE double_vector deviance_gap(double_vector y, double_vector k, double m, double gap) {
+  const auto c = every(m + gap);
+  const auto ahead = deviance(c, hn::Add(y, every(gap)), hn::Neg(k));
+  const auto pull = hn::Mul(every(gap / (m + gap)), k);
+  const auto behind = deviance(y, hn::Sub(y, pull), pull);
+  return hn::Neg(hn::Add(hn::Mul(every(gap / (m + gap)), ahead), behind));
+}
+
+// ln of x! / x^x e^x less that of c!.
+HWY_INLINE double_vector remainder_rise(const factorial_term& term, double_vector x) {
+  return hn::Sub(factorial_remainder(x), every(term.remainder));
 }
 
 // exp(log ratio of y). Numbers y that have no factorial give 0.
@@ -95,9 +114,14 @@ HWY_INLINE double_vector ratio_at(const log_ratio& r, double_vector y) {
     const truths outside = hn::Lt(argument, zero);
     none = hn::Or(none, outside);
     const auto x = hn::IfThenElse(outside, every(term.center), argument);
-    const auto rise = hn::Add(deviance(x, every(term.center)),
-                              hn::Sub(factorial_remainder(x), every(term.remainder)));
+    auto rise = remainder_rise(term, x);
+    if (r.gap == 0)
+      rise = hn::Add(deviance(x, every(term.center), hn::Sub(x, every(term.center))), rise);
     sum = hn::Add(sum, hn::Mul(every(term.sign), rise));
+  }
+  if (r.gap != 0) {
+    const auto x = hn::IfThenElse(none, every(r.reference), y);
+    sum = hn::Add(sum, deviance_gap(x, hn::Sub(x, every(r.reference)), r.reference, r.gap));
   }
   return hn::IfThenElse(none, zero, vector_exp(sum));
 }

@@ -44,5 +44,11 @@ void log_ratio::add(double sign, double direction, double center) {
   factorial_remainders(&center, 1, &next.remainder);
 }
 
+void log_ratio::add_quotient(double difference) {
+  gap = difference;
+  add(1, 1, reference + gap);
+  add(-1, 1, reference);
+}
+
 }  // namespace tarn::statistics
 #endif

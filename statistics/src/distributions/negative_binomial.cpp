@@ -31,12 +31,15 @@ tabulated_values invert_negative_binomial(const negative_binomial_law& law, std:
 nbar::nbar(const negative_binomial_law& law, std::size_t uses) : result{0, 1} {
   const double a1 = law.a - 1, p = law.p, q = law.q;
   const double mode = std::floor(law.v);
-  // Differences of large numbers next to each other are written out: (a1 + k) q - k = a1 q - p k.
   ratio.reference = std::max(mode, 1.0);
-  ratio.slope = std::log1p((a1 * q - p * ratio.reference) / ratio.reference);
+  // ln((a1 + k) q / k), where (a1 + k) q - k = a1 q - p k is the difference of large numbers next
+  // to each other; its error counts as often as there are steps from the mode.
+  const auto excess = static_cast<double>(a1 * (1 - static_cast<long double>(p)) -
+                                          static_cast<long double>(p) * ratio.reference);
+  ratio.slope = std::log1p(excess / ratio.reference);
   ratio.shift = mode == 0 ? std::log1p(a1 * q - p) : 0;
-  ratio.add(1, 1, a1 + ratio.reference);
-  ratio.add(-1, 1, ratio.reference);
+  if (a1 > 0)
+    ratio.add_quotient(a1);
   near.center = mode;
   if (uses >= near_ratios::worth)
     near.keep(ratio);

@@ -9,6 +9,7 @@
 #include <cstddef>
 #include <limits>
 
+#include "blocks.hpp"
 #include "distributions/placement.hpp"
 
 namespace tarn::statistics {
@@ -46,6 +47,9 @@ void end_normals(const float* z, std::size_t n, const normal_end<float>& end, bo
                  float* out);
 void end_normals(const double* z, std::size_t n, const normal_end<double>& end, bool streaming,
                  double* out);
+
+// The pairs that the next kernels take at a time.
+inline constexpr std::size_t box_muller_block = block_words / 2;
 
 // Pairs (u0, u1) of reals of [0, 1] in place: to the normal sqrt(-2 ln u0) sin(2 pi u1), the first
 // `pairs` numbers, and to two, the second one with the cosine.

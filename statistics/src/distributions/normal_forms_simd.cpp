@@ -30,12 +30,21 @@ void end_all(const Real* z, std::size_t n, const normal_end<Real>& end, bool str
           [&](auto v) { return place(inline_exp(d, hn::Add(hn::Mul(v, scale), offset))); });
 }
 
-// u0 becomes the radius.
+// Pairs, taken apart: the radii of the first numbers, and the second ones as they are.
+template <class Real>
+struct polar_block {
+  HWY_ALIGN Real radius[box_muller_block + HWY_MAX_BYTES / sizeof(Real)];
+  HWY_ALIGN Real u1[box_muller_block + HWY_MAX_BYTES / sizeof(Real)];
+};
+
 template <class D>
-HWY_INLINE void to_radii(D d, hn::TFromD<D>* u, std::size_t pairs) {
-  map_pairs<2>(d, u, pairs, u, [&](auto u0, auto u1, auto* to) {
-    const auto radius = hn::Sqrt(hn::Mul(hn::Set(d, -2), guarded_log(d, u0)));
-    hn::StoreInterleaved2(radius, u1, d, to);
+HWY_INLINE void to_polar(D d, const hn::TFromD<D>* u, std::size_t pairs,
+                         polar_block<hn::TFromD<D>>& to) {
+  auto* u1_to = to.u1;
+  map_pairs<1>(d, u, pairs, to.radius, [&](auto u0, auto u1, auto* radius) {
+    hn::StoreU(hn::Sqrt(hn::Mul(hn::Set(d, -2), guarded_log(d, u0))), d, radius);
+    hn::StoreU(u1, d, u1_to);
+    u1_to += hn::Lanes(d);
   });
 }
 
@@ -48,8 +57,9 @@ HWY_INLINE sine_and_cosine<D> turned(D d, hn::Vec<D> u1) {
 template <class Real>
 void sines(Real* u, std::size_t pairs) {
   const hn::ScalableTag<Real> d;
-  to_radii(d, u, pairs);
-  map_pairs<1>(d, u, pairs, u, [&](auto radius, auto u1, Real* to) {
+  polar_block<Real> polar;
+  to_polar(d, u, pairs, polar);
+  map_two<1>(d, polar.radius, polar.u1, pairs, u, [&](auto radius, auto u1, Real* to) {
     hn::StoreU(hn::Mul(radius, turned(d, u1).sine), d, to);
   });
 }
@@ -57,8 +67,9 @@ void sines(Real* u, std::size_t pairs) {
 template <class Real>
 void sines_and_cosines(Real* u, std::size_t pairs) {
   const hn::ScalableTag<Real> d;
-  to_radii(d, u, pairs);
-  map_pairs<2>(d, u, pairs, u, [&](auto radius, auto u1, Real* to) {
+  polar_block<Real> polar;
+  to_polar(d, u, pairs, polar);
+  map_two<2>(d, polar.radius, polar.u1, pairs, u, [&](auto radius, auto u1, Real* to) {
     const auto at = turned(d, u1);
     hn::StoreInterleaved2(hn::Mul(radius, at.sine), hn::Mul(radius, at.cosine), d, to);
   });

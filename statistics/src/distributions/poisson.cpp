@@ -9,21 +9,38 @@
 
 namespace tarn::statistics {
 
+poisson_steps::poisson_steps(double lambda)
+    : lambda_(lambda), term_(std::exp(-lambda_)), sum_(term_) {}
+
+double poisson_steps::next() {
+  const auto reached = static_cast<double>(sum_);
+  term_ *= lambda_ / ++k_;
+  // The terms fall behind the mode; rounding may leave their sum just below 1.
+  if (k_ > lambda_ && term_ < 0x1p-60L)
+    sum_ = 1;
+  else
+    sum_ += term_;
+  return reached;
+}
+
 guide_table poisson_table(double lambda, std::size_t uses) {
-  // In long double, so that the cdf is right to the last bit of double but for rare ties.
   std::vector<double> cdf;
-  cdf.reserve(128);
-  long double term = std::exp(-static_cast<long double>(lambda)), sum = term;
-  for (int k = 1; static_cast<double>(sum) < 1; ++k) {
-    cdf.push_back(static_cast<double>(sum));
-    term *= static_cast<long double>(lambda) / k;
-    // The terms fall behind the mode; rounding may leave their sum just below 1.
-    if (k > lambda && term < 0x1p-60L)
-      break;
-    sum += term;
-  }
-  cdf.push_back(1);
+  cdf.reserve(most_small_values);
+  poisson_steps steps(lambda);
+  do
+    cdf.push_back(steps.next());
+  while (cdf.back() < 1);
   return guide_table(std::move(cdf), uses);
+}
+
+void poisson_by_steps(const double* u, std::size_t n, double lambda, std::int32_t* out) {
+  const double most = std::min(*std::max_element(u, u + n), guide_table::greatest);
+  double cdf[most_small_values];
+  double* step = cdf;
+  poisson_steps steps(lambda);
+  while ((*step = steps.next()) <= most)
+    ++step;
+  count_steps(u, n, cdf, out);
 }
 
 // Interpolated with 40 digits.

@@ -20,8 +20,32 @@ inline constexpr double table_rates = 32;
 // by less than exp(-2^38). Larger rates are taken as this one.
 inline constexpr double greatest_rate = 0x1p40;
 
+// More than the values of such a rate that count in a double.
+inline constexpr int most_small_values = 128;
+
+// The cdf of a rate below table_rates, step by step.
+class poisson_steps {
+ public:
+  explicit poisson_steps(double lambda);
+
+  // P(X <= 0) at first; 1 or next to it when no further probability counts.
+  double next();
+
+ private:
+  // In long double, so that the cdf is right to the last bit of double but for rare ties.
+  long double lambda_, term_, sum_;
+  int k_ = 0;
+};
+
 // The cdf of a rate below table_rates, for `uses` look-ups.
 guide_table poisson_table(double lambda, std::size_t uses);
+
+// Fewer numbers than this are done sooner without that table (measured).
+inline constexpr std::size_t worth_poisson_table = 128;
+static_assert(worth_poisson_table <= block_words);
+
+// The same values for fewer numbers than that, from no more steps than they reach.
+void poisson_by_steps(const double* u, std::size_t n, double lambda, std::int32_t* out);
 
 // The inverse through the normal law: floor(x(z)) of the normal deviate z that belongs to the same
 // probability, with Temme's uniform expansion (The asymptotic expansion of the incomplete gamma

@@ -58,15 +58,12 @@ HWY_INLINE real_vector expansion(real_vector u, real_vector lambda) {
   return hn::Add(lambda, hn::Add(hn::Mul(root, z), hn::Add(curve, correction)));
 }
 
-// More terms than the probabilities of a rate below table_rates have that count in a double.
-constexpr int sum_terms = 128;
-
 struct reciprocal_table {
-  double of[sum_terms];
+  double of[most_small_values];
 };
 constexpr reciprocal_table make_reciprocals() {
   reciprocal_table table{};
-  for (int k = 1; k < sum_terms; ++k)
+  for (int k = 1; k < most_small_values; ++k)
     table.of[k] = 1.0 / k;
   return table;
 }
@@ -81,7 +78,7 @@ HWY_INLINE real_vector sum_up(real_vector u, real_vector lambda) {
   auto term = vector_exp(hn::Neg(lambda));
   auto sum = term;
   auto count = hn::Zero(d);
-  for (int k = 1; k < sum_terms; ++k) {
+  for (int k = 1; k < most_small_values; ++k) {
     const auto above = hn::And(hn::Ge(u, sum), hn::Gt(term, negligible));
     if (hn::AllFalse(d, above))
       break;

@@ -70,12 +70,15 @@ void wide_words_to_float(const std::uint32_t* words, std::size_t n, affine<float
   const hn::RebindToFloat<decltype(du)> dd;
   const hn::Rebind<float, decltype(du)> d;
   // Rounding to float by way of double is right if the first step rounds to odd (53 >= 24 + 2
-  // bits): the bits that a double cannot hold leave their trace in the last one that it can.
+  // bits): the bits that a double cannot hold leave their trace in the last one that it can. Words
+  // that a double holds whole go through it as they are.
   const auto lost = hn::Set(du, (std::uint64_t{1} << (wide_word_bits - 53)) - 1);
   const auto last = hn::Set(du, std::uint64_t{1} << (wide_word_bits - 53));
+  const auto beyond = hn::Set(du, std::uint64_t{1} << 53);
   words_to_reals(d, reinterpret_cast<const std::uint64_t*>(words), n, map, end, out, [&](auto w) {
     const auto trace = hn::IfThenZeroElse(hn::Eq(hn::And(w, lost), hn::Zero(du)), last);
-    return hn::DemoteTo(d, hn::ConvertTo(dd, hn::AndNot(lost, hn::Or(w, trace))));
+    const auto odd = hn::AndNot(lost, hn::Or(w, trace));
+    return hn::DemoteTo(d, hn::ConvertTo(dd, hn::IfThenElse(hn::Lt(w, beyond), w, odd)));
   });
 }
 

@@ -7,6 +7,7 @@
 
 #include "engines/digital_net_record.hpp"
 #include "engines/digital_net_tiles.hpp"
+#include "tarn_rvx.h"
 
 namespace tarn::statistics::net {
 
@@ -54,35 +55,67 @@ void draw_points(const record& net, place to, std::uint32_t* out) {
   std::copy(net.point + at.taken, net.point + to.taken, out);
 }
 
-}  // namespace
+// Words of a seed before those of the user's.
+constexpr std::size_t header_words = 3;
 
-std::size_t state_size(std::uint64_t dims) {
-  if (dims == 0 || dims > max_stream_bytes / sizeof(std::uint32_t))
-    return bad_seed;
+std::uint32_t dims_of(span<std::uint32_t> seed) {
+  return seed.size == 0 ? 1 : seed.data[0];
+}
+
+// Bytes of the state of so many dimensions.
+std::uint64_t bytes_of(std::uint64_t dims) {
   const std::uint64_t words =
       directions_field + dims * (direction_words + (dims <= near_dims ? 0 : 1));
-  const std::uint64_t bytes = words * sizeof(std::uint32_t);
+  return words * sizeof(std::uint32_t);
+}
+
+// The same, or bad_seed if there are none or too many.
+std::size_t size_of(std::uint64_t dims) {
+  if (dims == 0)
+    return bad_seed;
+  const std::uint64_t bytes = bytes_of(dims);
   return bytes > max_stream_bytes - header_bytes ? bad_seed : static_cast<std::size_t>(bytes);
 }
 
-std::uint32_t* prepare(void* state, std::uint32_t dims) {
-  std::memset(state, 0, state_size(dims));
-  auto* words = static_cast<std::uint32_t*>(state);
-  words[index_field] = 1;
-  words[dims_field] = dims;
-  words[marker_field] = made_here;
-  return words + directions_field;
+}  // namespace
+
+const std::uint32_t* users_words(span<std::uint32_t> seed) {
+  return seed.size <= 1 ? nullptr : seed.data + header_words;
 }
 
-void place_first_point(void* state) {
+std::size_t state_size(const seed_form& form, span<std::uint32_t> seed) {
+  const std::uint32_t dims = dims_of(seed);
+  if (seed.size <= 1)
+    return dims <= form.table_dims ? size_of(dims) : bad_seed;
+  const bool users = seed.size >= header_words && seed.data[1] == 1 && seed.data[2] == form.kind &&
+                     (seed.size - header_words) / form.words >= dims;
+  return users ? size_of(dims) : bad_seed;
+}
+
+int seed_state(void* state, const seed_form& form, span<std::uint32_t> seed,
+               void (*direct)(const std::uint32_t* words, std::uint32_t* directions)) {
+  const std::uint32_t dims = dims_of(seed);
+  std::memset(state, 0, bytes_of(dims));
+  auto* fields = static_cast<std::uint32_t*>(state);
+  fields[index_field] = 1;
+  fields[dims_field] = dims;
+  fields[marker_field] = made_here;
+  std::uint32_t* directions = fields + directions_field;
+  if (const std::uint32_t* words = users_words(seed); words == nullptr) {
+    std::copy_n(form.table, dims * direction_words, directions);
+  } else {
+    for (std::size_t d = 0; d < dims; ++d)
+      direct(words + d * form.words, directions + d * direction_words);
+  }
   move_point(record(state), 0, 1);
+  return RVX_STATUS_OK;
 }
 
 bool accepts(const void* state, std::size_t size, std::uint32_t) {
   // The size first, and then field by field: in a damaged image the size may be wrong, and there
   // may be less than a record.
   const std::size_t dims = dims_of(size);
-  return state_size(dims) == size && read(state, dims_field) == dims &&
+  return size_of(dims) == size && read(state, dims_field) == dims &&
          read(state, marker_field) == made_here && read(state, owed_field) < dims &&
          (read(state, index_field) != 0 || read(state, owed_field) == 0);
 }

@@ -19,14 +19,27 @@ namespace tarn::statistics::net {
 // last point finds a word as well.
 inline constexpr std::size_t direction_words = 33;
 
-// Bytes of the state of a net of so many dimensions, or bad_seed if there are none or too many: a
-// stream has less than 2^31 bytes.
-std::size_t state_size(std::uint64_t dims);
+// What a net is seeded with: nothing (1 dimension); the number of dimensions; or the number of
+// dimensions, 1, `kind`, and `words` words of the user's for each dimension.
+struct seed_form {
+  const std::uint32_t* table;  // direction words of the dimensions that need none of the user's
+  std::uint32_t table_dims;
+  std::uint32_t kind;
+  std::size_t words;
+};
 
-// Writes the fields of a first state of `dims` dimensions and hands out the place of the direction
-// words, all of them 0. place_first_point has to follow when they are written.
-std::uint32_t* prepare(void* state, std::uint32_t dims);
-void place_first_point(void* state);
+// The words of the user's for the first dimension, with those for the others behind them; null
+// where the seed has none.
+const std::uint32_t* users_words(span<std::uint32_t> seed);
+
+// Bytes of the state of a net so seeded, or bad_seed if the words are of no such form, or the
+// dimensions none or too many: a stream has less than 2^31 bytes.
+std::size_t state_size(const seed_form& form, span<std::uint32_t> seed);
+
+// Writes a first state. direct(words, directions) makes direction words v_1, ..., v_32 from the
+// user's for one dimension.
+int seed_state(void* state, const seed_form& form, span<std::uint32_t> seed,
+               void (*direct)(const std::uint32_t* words, std::uint32_t* directions));
 
 // The functions of engine_ops.
 bool accepts(const void* state, std::size_t size, std::uint32_t member);

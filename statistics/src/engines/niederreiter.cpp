@@ -8,7 +8,6 @@
 #include "engine.hpp"
 #include "engines/digital_net.hpp"
 #include "engines/niederreiter_directions.hpp"
-#include "tarn_rvx.h"
 
 namespace tarn::statistics {
 
@@ -19,40 +18,24 @@ constexpr std::uint32_t table[] = {
 };
 static_assert(sizeof table == niederreiter::table_dims * net::direction_words * sizeof *table);
 
-// Seed words: none (1 dimension); the number of dimensions; or the number of dimensions, 1, 1,
-// and an irreducible polynomial for each dimension.
-constexpr std::size_t header_words = 3;
-constexpr std::uint32_t user_header[] = {1, 1};
-
-std::uint32_t dims_of(span<std::uint32_t> seed) {
-  return seed.size == 0 ? 1 : seed.data[0];
-}
+// The user's word is an irreducible polynomial.
+constexpr net::seed_form form{table, niederreiter::table_dims, 1, 1};
 
 std::size_t state_size(span<std::uint32_t> seed) {
-  const std::uint32_t dims = dims_of(seed);
-  if (seed.size <= 1)
-    return dims <= niederreiter::table_dims ? net::state_size(dims) : bad_seed;
-  const bool users = seed.size >= header_words && seed.data[1] == user_header[0] &&
-                     seed.data[2] == user_header[1] && seed.size - header_words >= dims;
-  if (!users)
-    return bad_seed;
-  const std::uint32_t* polynomials = seed.data + header_words;
-  return std::all_of(polynomials, polynomials + dims, niederreiter::is_irreducible)
-             ? net::state_size(dims)
+  const std::size_t size = net::state_size(form, seed);
+  const std::uint32_t* polynomials = net::users_words(seed);
+  if (size == bad_seed || polynomials == nullptr)
+    return size;
+  return std::all_of(polynomials, polynomials + seed.data[0], niederreiter::is_irreducible)
+             ? size
              : bad_seed;
 }
 
-int seed(void* state, std::uint32_t, span<std::uint32_t> seed) {
-  const std::uint32_t dims = dims_of(seed);
-  std::uint32_t* directions = net::prepare(state, dims);
-  if (seed.size <= 1) {
-    std::copy_n(table, dims * net::direction_words, directions);
-  } else {
-    for (std::size_t d = 0; d < dims; ++d)
-      niederreiter::direct(seed.data[header_words + d], directions + d * net::direction_words);
-  }
-  net::place_first_point(state);
-  return RVX_STATUS_OK;
+int seed(void* state, std::uint32_t, span<std::uint32_t> words) {
+  return net::seed_state(state, form, words,
+                         [](const std::uint32_t* polynomial, std::uint32_t* directions) {
+                           niederreiter::direct(*polynomial, directions);
+                         });
 }
 
 }  // namespace

@@ -13,7 +13,13 @@ namespace {
 using namespace tarn::statistics;
 
 int from_table(const live_stream& s, int n, std::int32_t* r, double lambda) {
-  const guide_table table = poisson_table(lambda, static_cast<std::size_t>(n));
+  const auto uses = static_cast<std::size_t>(n);
+  if (uses < worth_poisson_table)
+    return draw_from(s, n, 1, r,
+                     one_word_values{0, [&](const double* u, std::size_t count, std::int32_t* to) {
+                                       poisson_by_steps(u, count, lambda, to);
+                                     }});
+  const guide_table table = poisson_table(lambda, uses);
   return draw_from(s, n, 1, r,
                    one_word_values{0, [&](const double* u, std::size_t count, std::int32_t* to) {
                                      table.look_up(u, count, to);

@@ -6,8 +6,8 @@
 #include <type_traits>
 
 #include "distributions/placement.hpp"
+#include "simd/inline_math-inl.hpp"
 #include "simd/map-inl.hpp"
-#include "simd/vector_math-inl.hpp"
 
 #if defined(TARN_FORMS_INL_HPP) == defined(HWY_TARGET_TOGGLE)
 #ifdef TARN_FORMS_INL_HPP
@@ -32,7 +32,7 @@ inline constexpr Real log_of_zero = std::is_same_v<Real, float>
 template <class D>
 HWY_INLINE hn::Vec<D> guarded_log(D d, hn::Vec<D> u) {
   const auto log_zero = hn::Set(d, log_of_zero<hn::TFromD<D>>);
-  return hn::IfThenElse(hn::Eq(u, hn::Zero(d)), log_zero, vector_log(u));
+  return hn::IfThenElse(hn::Eq(u, hn::Zero(d)), log_zero, inline_log<base::e>(d, u));
 }
 
 // A placement in vectors.

@@ -118,12 +118,13 @@ TEST_F(negative_binomial, small_laws_are_inverted) {
 }
 
 TEST_F(negative_binomial, large_laws_are_the_mountain) {
-  // With and without pieces on the left: those need (a - 1) q > 1, about. Laws of small shape that
-  // are wider than some thousand are left out: last places of the hat's heights move a candidate
-  // there by more than a millionth, now and then across an integer.
-  constexpr double laws[][2] = {{101.1, 0.5},    {26.1, 0.2},  {902, 0.9},  {1000, 0.01},
-                                {2.6, 0.015625}, {2.1, 0.015}, {1, 0.0011}, {1.0001, 0.01},
-                                {1.5, 0.001},    {2.01, 0.01}, {1e5, 0.3},  {1e9, 0.7}};
+  // With and without pieces on the left: those need (a - 1) q > 1, about. Some are wide, with
+  // values up to the greatest.
+  constexpr double laws[][2] = {
+      {101.1, 0.5}, {26.1, 0.2},  {902, 0.9},   {1000, 0.01},  {2.6, 0.015625}, {2.1, 0.015},
+      {1, 0.0011},  {1.5, 0.001}, {2.01, 0.01}, {1e5, 0.3},    {1e9, 0.7},      {1.0001, 0.01},
+      {1, 1e-9},    {1.5, 1e-6},  {2.5, 1e-9},  {1.001, 1e-9},
+  };
   for (const auto& l : laws) {
     SCOPED_TRACE(testing::Message() << l[0] << ", " << l[1]);
     const counts::law law = counts::negative_binomial(l[0], l[1]);

@@ -9,17 +9,11 @@ using kat_niederreiter = support::on_simd_target;
 constexpr std::uint32_t all_dims = 4720;
 
 TEST_F(kat_niederreiter, points) {
-  std::size_t compared = 0;
-  ASSERT_NO_FATAL_FAILURE(
-      support::compare_points(RVX_BRNG_NIEDERR, "niederreiter_base2", all_dims, compared));
-  EXPECT_EQ(compared, 47u);
+  support::compare_points(RVX_BRNG_NIEDERR, "niederreiter_base2", all_dims, 47);
 }
 
 TEST(kat_niederreiter_directions, of_listed_dimensions_and_hash_of_all) {
-  std::size_t compared = 0;
-  ASSERT_NO_FATAL_FAILURE(support::compare_directions(
-      RVX_BRNG_NIEDERR, "niederreiter_base2_directions", all_dims, compared));
-  EXPECT_EQ(compared, 26u);
+  support::compare_directions(RVX_BRNG_NIEDERR, "niederreiter_base2_directions", all_dims, 26);
 }
 
 }  // namespace

@@ -9,17 +9,11 @@ using kat_sobol = support::on_simd_target;
 constexpr std::uint32_t all_dims = 3667;
 
 TEST_F(kat_sobol, points) {
-  std::size_t compared = 0;
-  ASSERT_NO_FATAL_FAILURE(
-      support::compare_points(RVX_BRNG_SOBOL, "sobol_joekuo", all_dims, compared));
-  EXPECT_EQ(compared, 48u);
+  support::compare_points(RVX_BRNG_SOBOL, "sobol_joekuo", all_dims, 48);
 }
 
 TEST(kat_sobol_directions, of_listed_dimensions_and_hash_of_all) {
-  std::size_t compared = 0;
-  ASSERT_NO_FATAL_FAILURE(
-      support::compare_directions(RVX_BRNG_SOBOL, "sobol_joekuo_directions", all_dims, compared));
-  EXPECT_EQ(compared, 34u);
+  support::compare_directions(RVX_BRNG_SOBOL, "sobol_joekuo_directions", all_dims, 34);
 }
 
 // The 40 dimensions of Algorithm 659, which has other direction numbers and 30 bits: the words

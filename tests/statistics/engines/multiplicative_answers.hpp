@@ -72,4 +72,13 @@ inline void expect_answer(std::int64_t code, std::size_t parts, const answer& kn
   }
 }
 
+// All `count` answers of an engine.
+inline void expect_answers(const std::string& engine, std::int64_t code, std::size_t parts,
+                           std::size_t count) {
+  const auto all = answers(engine);
+  ASSERT_EQ(all.size(), count);
+  for (const answer& known : all)
+    expect_answer(code, parts, known);
+}
+
 }  // namespace multiplicative

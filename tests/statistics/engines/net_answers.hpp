@@ -12,9 +12,10 @@ namespace support {
 
 // Compares each "point I : ..." line of the file with the stream of so many dimensions; the lines
 // "dims ..." before it name the dimensions. The words around the point are drawn with it, so that
-// it is met within a run as well. Counts the points.
+// it is met within a run as well. There are `count` such points.
 inline void compare_points(std::int64_t code, const std::string& file, std::uint32_t max_dims,
-                           std::size_t& compared) {
+                           std::size_t count) {
+  std::size_t compared = 0;
   std::vector<std::uint32_t> dims;
   for (const tarn::kat::line& next : tarn::kat::read_file(TARN_KAT_FOLDER, file)) {
     if (next.fields.at(0) == "dims") {
@@ -39,12 +40,14 @@ inline void compare_points(std::int64_t code, const std::string& file, std::uint
           << "line " << next.number << ", dimension " << dims[i];
     ++compared;
   }
+  EXPECT_EQ(compared, count);
 }
 
-// Compares "dim D : v_1 ... v_32" lines with the record of a stream with all dimensions, and the
-// hash over all of them: FNV-1a of 64 bits with the file's own initial value.
+// Compares the `count` "dim D : v_1 ... v_32" lines with the record of a stream with all
+// dimensions, and the hash over all of them: FNV-1a of 64 bits with the file's own initial value.
 inline void compare_directions(std::int64_t code, const std::string& file, std::uint32_t dims,
-                               std::size_t& compared) {
+                               std::size_t count) {
+  std::size_t compared = 0;
   const net_stream s(code, {dims});
   bool hashed = false;
   for (const tarn::kat::line& next : tarn::kat::read_file(TARN_KAT_FOLDER, file)) {
@@ -69,6 +72,7 @@ inline void compare_directions(std::int64_t code, const std::string& file, std::
     ++compared;
   }
   EXPECT_TRUE(hashed);
+  EXPECT_EQ(compared, count);
 }
 
 }  // namespace support
