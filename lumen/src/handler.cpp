@@ -170,22 +170,35 @@ void handler::mem_advise(void* pointer, std::size_t bytes, int advice) {
   }));
 }
 
+namespace {
+// Makes the task known to all that it has to wait for, to its buffers and to its queue.
+void link_task(detail::task& task, const std::vector<detail::task_ref>& dependencies,
+               detail::queue_core& core) {
+  for (const detail::task_ref& dependency : dependencies) {
+    task.depend_on(*dependency.get());
+  }
+  if (task.accesses().empty()) {
+    core.add(task);
+  } else {
+    const std::lock_guard<std::mutex> lock(detail::access_record::order_mutex());
+    for (const detail::access_request& access : task.accesses()) {
+      access.core->record().add(task, access.writes);
+    }
+    core.add(task);
+  }
+}
+}  // namespace
+
 event handler::finish() {
   detail::queue_core& core = *group_.queue;
   const std::vector<detail::task_ref> dependencies = std::move(group_.dependencies);
   auto* task = new detail::task(core.shared_from_this(), std::move(group_));
   event result = detail::event_access::make(detail::share(*task));
-  for (const detail::task_ref& dependency : dependencies) {
-    task->depend_on(*dependency.get());
-  }
-  if (task->accesses().empty()) {
-    core.add(*task);
-  } else {
-    const std::lock_guard<std::mutex> lock(detail::access_record::order_mutex());
-    for (const detail::access_request& access : task->accesses()) {
-      access.core->record().add(*task, access.writes);
-    }
-    core.add(*task);
+  try {
+    link_task(*task, dependencies, core);
+  } catch (...) {  // out of memory
+    task->abandon();
+    throw;
   }
   task->finish_linking();
   return result;

@@ -58,8 +58,8 @@ void task::depend_on(task& other) {
     if (other.done()) {
       return;
     }
+    other.successors_.push_back(share(*this));  // may throw: nothing is counted then
     unmet_.fetch_add(1, std::memory_order_relaxed);
-    other.successors_.push_back(share(*this));
   }
   const std::lock_guard<std::mutex> lock(mutex_);
   dependencies_.push_back(share(other));
@@ -71,6 +71,13 @@ void task::finish_linking() {
     futex_wake_all(word_);
   }
   dependency_done();
+}
+
+void task::abandon() noexcept {
+  kind_ = work_kind::none;
+  work_.reset();
+  queue_.reset();
+  finish_linking();
 }
 
 void task::dependency_done() {

@@ -37,6 +37,9 @@ class task {
   // Until finish_linking dependencies may be added; from then on the task may run.
   void depend_on(task& other);
   void finish_linking();
+  // In place of finish_linking, when linking failed before the queue knew of the task: it does
+  // nothing, and goes when what it depends on so far is done.
+  void abandon() noexcept;
 
   task_state state() const noexcept {
     return static_cast<task_state>(word_.load(std::memory_order_acquire) & state_mask);

@@ -92,6 +92,8 @@ TYPED_TEST(MathExact, RoundingStepsAndExtremes) {
   EXPECT_TRUE(same(sycl::maxmag(T(-3), T(3)), T(3)));
   EXPECT_TRUE(same(sycl::fdim(T(3), T(1)), T(2)));
   EXPECT_TRUE(same(sycl::copysign(T(3), T(-0.0)), T(-3)));
+  EXPECT_TRUE(same(sycl::fabs(T(-0.0)), T(0)));
+  EXPECT_TRUE(same(sycl::fabs(-this->infinity), this->infinity));
   EXPECT_TRUE(same(sycl::nextafter(T(1), T(2)), T(1) + std::numeric_limits<T>::epsilon()));
   EXPECT_TRUE(same(sycl::fmod(T(-7), T(4)), T(-3)));
   EXPECT_TRUE(same(sycl::remainder(T(7), T(4)), T(-1)));

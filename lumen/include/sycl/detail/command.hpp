@@ -156,7 +156,9 @@ class range_kernel final : public kernel_command {
   range_kernel(const range<Dimensions>& sizes, const id<Dimensions>& offset,
                const Function& function)
       : sizes_(sizes), offset_(offset), function_(function) {}
-  void run_items(std::size_t begin, std::size_t end) const override {
+  // Everything that a kernel calls is inlined, as compilers for devices do: what does not vary from
+  // item to item then leaves the loop.
+  [[gnu::flatten]] void run_items(std::size_t begin, std::size_t end) const override {
     for_items<Dimensions>(sizes_, offset_, begin, end, [this](const item<Dimensions>& position) {
       call_with_item(function_, position);
     });
