@@ -5,7 +5,9 @@
 // range.
 #pragma once
 
+#include <algorithm>
 #include <cmath>
+#include <cstddef>
 #include <cstdint>
 
 namespace tarn::statistics::parameters {
@@ -23,6 +25,11 @@ bool positive(Real x) {
   return x > 0 && std::isfinite(x);
 }
 
+template <class Real>
+bool all_finite(const Real* x, std::size_t n) {
+  return std::all_of(x, x + n, [](Real number) { return std::isfinite(number); });
+}
+
 // Pairs of a condition and a position, looked at in order.
 inline int first_bad() {
   return good;
@@ -32,10 +39,14 @@ int first_bad(bool holds, int position, Rest... rest) {
   return holds ? first_bad(rest...) : position;
 }
 
-// Also true for bounds that are not numbers.
-template <class Value>
-int uniform(Value a, Value b) {
-  return a < b ? good : 5;
+// Results are made of b - a and a + b, taken in their type: both have to be finite, and so are then
+// the bounds.
+template <class Real>
+int uniform(Real a, Real b) {
+  return first_bad(a < b && std::isfinite(b - a) && std::isfinite(a + b), 5);
+}
+inline int uniform(std::int32_t a, std::int32_t b) {
+  return first_bad(a < b, 5);
 }
 
 // gaussian, exponential, rayleigh, gumbel, laplace, cauchy: a place and a scale.
@@ -65,7 +76,7 @@ inline int chi_square(std::int32_t degrees) {
   return first_bad(degrees > 0, 5);
 }
 
-// `values` numbers of a covariance factor in the layout, and the means of `dimension`.
+// The means and the factor themselves are looked at when they are used.
 template <class Real>
 int gaussian_mv(std::int32_t dimension, std::int32_t layout, const Real* mean, const Real* matrix) {
   return first_bad(dimension > 0, 5, 0 <= layout && layout <= 2, 6, mean != nullptr, 7,

@@ -196,9 +196,9 @@ RVX_API int rvxLoadStreamF(rvx_stream* stream, const char* name, int length);
  * for the k-th argument. Formulas, words consumed, sources and accuracy: the manual's page of each.
  * \{ */
 
-/** Uniform on [a, b), a < b (-5): the word-to-real rule of the engine, one word for one result. The
- * values b - a and a + b are taken in the type of the results and must be finite. Rounding may
- * deliver b itself; with the accuracy flag no result lies outside [a, b]. */
+/** Uniform on [a, b), a < b, with b - a and a + b finite in the type of the results (-5): the
+ * word-to-real rule of the engine, one word for one result. Rounding may deliver b itself; with the
+ * accuracy flag no result lies outside [a, b]. */
 RVX_API int rvxsRngUniform(int64_t method, rvx_stream stream, int64_t n, float* r, float a,
                            float b);
 /** The same in double precision. */
@@ -230,7 +230,8 @@ RVX_API int rvxdRngGaussian(int64_t method, rvx_stream stream, int64_t n, double
 
 /** n vectors of `dimension` (-5) correlated normals, mean + T z with the lower triangular factor T
  * of the covariance: layout (-6) 0 full, row by row; 1 packed, column by column from the diagonal
- * on; 2 diagonal. r holds n * dimension numbers. */
+ * on; 2 diagonal. The entries of mean (-7) and of matrix (-8), but for those above the diagonal in
+ * the full layout, are finite. r holds n * dimension numbers. */
 RVX_API int rvxsRngGaussianMV(int64_t method, rvx_stream stream, int64_t n, float* r,
                               int32_t dimension, int32_t layout, const float* mean,
                               const float* matrix);

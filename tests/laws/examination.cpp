@@ -67,7 +67,7 @@ void examination::add(double x) {
 
 std::vector<finding> examination::findings() const {
   std::vector<finding> all{range(), distance()};
-  if (moments_.spread == 0 || grain_.tolerance > 0)
+  if (moments_.spread == 0)
     return all;
   all.push_back(chi_square());
   const auto find = [&](double x) {
@@ -101,7 +101,7 @@ finding examination::distance() const {
     const double share = sum / static_cast<double>(n_);
     greatest = std::max({greatest, share - boundaries_[i].most, boundaries_[i].least - share});
   }
-  return {"Kolmogorov-Smirnov distance", greatest, grain_.tolerance + critical_distance(n_)};
+  return {"Kolmogorov-Smirnov distance", greatest, critical_distance(n_)};
 }
 
 // Cells are joined until they expect enough, and where the resolution would blur a count by more

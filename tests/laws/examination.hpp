@@ -21,10 +21,9 @@ namespace laws {
 struct grain {
   // A result x is off by relative * (|x| + place) + least at most.
   double relative, place;
-  double least;          // positive normal number of the type; 0 for integers
-  double probability;    // of one canonical value: F is met no better than this
-  bool exact_range;      // no result lies outside the support, not even by rounding
-  double tolerance = 0;  // stated total-variation distance of an approximate method
+  double least;        // positive normal number of the type; 0 for integers
+  double probability;  // of one canonical value: F is met no better than this
+  bool exact_range;    // no result lies outside the support, not even by rounding
 
   double at(double x) const;
 };

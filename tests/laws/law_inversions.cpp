@@ -83,6 +83,9 @@ double total_variation(const law& expected, const std::vector<double>& sorted) {
 
 TEST(inversions, corrected_normals_are_poisson_to_the_stated_distance) {
   constexpr std::size_t n = 1 << 18;
+  // For rates up to 10^6 (docs/distributions/poisson.md); greater ones have too many values to
+  // count.
+  constexpr double stated = 1e-6;
   std::size_t seen = 0;
   for (const specimen& s : laws::every_case()) {
     if (s.routine != "iRngPoisson" || s.method != RVX_RNG_METHOD_POISSON_GAUSSIAN_ICDF)
@@ -93,10 +96,10 @@ TEST(inversions, corrected_normals_are_poisson_to_the_stated_distance) {
     // Each count is right to one point.
     if (cells < n / 64.0) {
       const double apart = total_variation(v.expected, values);
-      EXPECT_LE(apart, v.resolution.tolerance + cells / n) << s.name();
+      EXPECT_LE(apart, stated + cells / n) << s.name();
       RecordProperty("distance_" + s.parameters, std::to_string(apart));
     }
-    EXPECT_LE(distance(s, values), v.resolution.tolerance + 3.0 / n) << s.name();
+    EXPECT_LE(distance(s, values), stated + 3.0 / n) << s.name();
     ++seen;
   }
   EXPECT_GE(seen, 12u);

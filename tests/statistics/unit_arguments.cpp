@@ -1,13 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 // Every bad argument of the public functions: its status, its report, and nothing written. The raw
 // entries, called without the checks in front, refuse the same.
-#include <cmath>
-#include <limits>
+#include <tuple>
 
+#include "good_parameters.hpp"
+#include "statistics/common/parameters.hpp"
 #include "support.hpp"
 
 namespace {
 
+namespace parameters = tarn::statistics::parameters;
 using list = support::reports::list;
 constexpr std::int64_t above_int = std::int64_t{1} << 31;
 
@@ -23,6 +25,14 @@ class unmarked {
   support::stream stream_;
 };
 
+// routine(method, stream, n, r) with these parameters behind.
+template <class Routine, class... Formal>
+auto with_parameters(const Routine& routine, const std::tuple<Formal...>& values) {
+  return [=](auto method, rvx_stream stream, auto n, auto* r) {
+    return std::apply([&](Formal... p) { return routine(method, stream, n, r, p...); }, values);
+  };
+}
+
 class arguments : public testing::Test {
  protected:
   // The call returned `status` and reported `position` of `name`, once.
@@ -31,27 +41,67 @@ class arguments : public testing::Test {
     EXPECT_EQ(reports_.take(), (list{{name, position}}));
   }
 
-  // The head that all routines share; `draw(method, stream, n, r)` is one of them.
-  template <class Value, class Draw>
-  void check_head(const char* name, const Draw& draw) {
-    support::results<Value> r(4);
+  // The head that all routines share: of a plain name, then of its raw entry.
+  template <class Value, class Plain, class Raw, class... Formal>
+  void check_head(const char* name, const Plain& plain, const Raw& raw,
+                  const std::tuple<Formal...>& good) {
+    support::results<Value> r(8);
+    Value* const none = nullptr;
+    const std::tuple<Formal...> bad{bad::value<Formal>()...};
     const support::record before = stream_.state();
+    const auto draw = with_parameters(plain, good);
     expect(draw(-1, stream_, 4, r.data()), -1, name, 1);
     expect(draw(std::int64_t{1} << 32, stream_, 4, r.data()), -1, name, 1);
     expect(draw(0, nullptr, 4, r.data()), -5, name, 2);
     expect(draw(0, unmarked_, 4, r.data()), -1006, name, 2);
     expect(draw(0, stream_, -1, r.data()), -3, name, 3);
-    expect(draw(0, stream_, 4, static_cast<Value*>(nullptr)), -4, name, 4);
+    expect(draw(0, stream_, 4, none), -4, name, 4);
     // In the order of the arguments: the first bad one is reported.
-    expect(draw(-1, nullptr, -1, static_cast<Value*>(nullptr)), -1, name, 1);
-    expect(draw(0, nullptr, -1, static_cast<Value*>(nullptr)), -5, name, 2);
-    expect(draw(0, stream_, -1, static_cast<Value*>(nullptr)), -3, name, 3);
-    EXPECT_EQ(draw(0, stream_, 0, static_cast<Value*>(nullptr)), 0);
-    EXPECT_EQ(draw(1, stream_, 0, static_cast<Value*>(nullptr)), 0) << "checked before n = 0";
-    EXPECT_TRUE(reports_.take().empty());
+    expect(draw(-1, nullptr, -1, none), -1, name, 1);
+    expect(draw(0, nullptr, -1, none), -5, name, 2);
+    expect(draw(0, stream_, -1, none), -3, name, 3);
+    EXPECT_EQ(with_parameters(plain, bad)(0, stream_, 0, none), 0) << name;
+    EXPECT_EQ(draw(0x20000000, stream_, 0, none), 0) << name << ": checked before n = 0";
+
+    const auto draw_raw = with_parameters(raw, good);
+    EXPECT_EQ(draw_raw(-1, nullptr, -1, none), -1) << name;
+    EXPECT_EQ(draw_raw(0, nullptr, -1, none), -5) << name;
+    EXPECT_EQ(draw_raw(0, unmarked_, -1, none), -1006) << name;
+    EXPECT_EQ(draw_raw(0, stream_, -1, none), -3) << name;
+    EXPECT_EQ(draw_raw(0, stream_, 4, none), -4) << name;
+    EXPECT_EQ(with_parameters(raw, bad)(0, stream_, 0, none), 0) << name;
+
+    expect_unmoved(name, before, r);
+    // Nothing but what was tried was wrong.
+    EXPECT_EQ(draw(0, stream_, 4, r.data()), 0) << name;
+    EXPECT_EQ(draw_raw(0, stream_, 4, r.data()), 0) << name;
+    EXPECT_TRUE(reports_.take().empty()) << name;
+  }
+
+  // Each bit that is none of `methods`, and the code 3 of gaussian, which is no method.
+  template <class Value, class Plain, class Raw, class Parameters>
+  void check_methods(const char* name, const Plain& plain, const Raw& raw, const Parameters& good,
+                     int methods) {
+    support::results<Value> r(8);
+    const support::record before = stream_.state();
+    const auto expect_refused = [&](int method) {
+      expect(with_parameters(plain, good)(method, stream_, 4, r.data()), -1, name, 1);
+      EXPECT_EQ(with_parameters(raw, good)(method, stream_, 4, r.data()), -1) << name;
+    };
+    for (int bit = 0; bit < 31; ++bit)
+      if ((methods >> bit & 1) == 0)
+        expect_refused(1 << bit);
+    if (methods == parameters::gaussian_methods)
+      expect_refused(3);
+    expect_unmoved(name, before, r);
+  }
+
+  template <class Value>
+  void expect_unmoved(const char* name, const support::record& before,
+                      const support::results<Value>& r) {
     const support::record after = stream_.state();
-    EXPECT_EQ(std::memcmp(&before, &after, sizeof before), 0);
-    EXPECT_TRUE(r.untouched());
+    EXPECT_EQ(std::memcmp(&before, &after, sizeof before), 0) << name;
+    EXPECT_TRUE(r.untouched()) << name;
   }
 
   support::reports reports_;
@@ -60,38 +110,30 @@ class arguments : public testing::Test {
 };
 
 TEST_F(arguments, heads_of_the_routines) {
-  check_head<float>("rvxsRngUniform", [](std::int64_t m, rvx_stream s, std::int64_t n, float* r) {
-    return rvxsRngUniform(m, s, n, r, 0, 1);
-  });
-  check_head<double>("rvxdRngUniform", [](std::int64_t m, rvx_stream s, std::int64_t n, double* r) {
-    return rvxdRngUniform(m, s, n, r, 0, 1);
-  });
-  check_head<std::int32_t>("rvxiRngUniform",
-                           [](std::int64_t m, rvx_stream s, std::int64_t n, std::int32_t* r) {
-                             return rvxiRngUniform(m, s, n, r, 0, 6);
-                           });
-  check_head<std::uint32_t>("rvxiRngUniformBits", rvxiRngUniformBits);
-  check_head<std::uint32_t>("rvxiRngUniformBits32", rvxiRngUniformBits32);
-  check_head<std::uint64_t>("rvxiRngUniformBits64", rvxiRngUniformBits64);
+#define TARN_ROUTINE(name, value, methods, width, parameters, arguments, check) \
+  check_head<value>("rvx" #name, rvx##name, _rvx##name, good::name);
+#include "statistics/common/routines.def"
+  check_head<std::int32_t>("rvxiRngPoissonV", rvxiRngPoissonV, _rvxiRngPoissonV,
+                           std::make_tuple(good::numbers<double>));
 }
 
-TEST_F(arguments, bounds_of_uniform) {
-  constexpr double nan = std::numeric_limits<double>::quiet_NaN();
-  support::results<float> f(4);
-  support::results<double> d(4);
-  support::results<std::int32_t> i(4);
-  expect(rvxsRngUniform(0, stream_, 4, f.data(), 1, 1), -5, "rvxsRngUniform", 5);
-  expect(rvxsRngUniform(0, stream_, 4, f.data(), 2, 1), -5, "rvxsRngUniform", 5);
-  expect(rvxdRngUniform(0, stream_, 4, d.data(), 1, 1), -5, "rvxdRngUniform", 5);
-  expect(rvxdRngUniform(0, stream_, 4, d.data(), nan, 1), -5, "rvxdRngUniform", 5);
-  expect(rvxdRngUniform(0, stream_, 4, d.data(), 0, nan), -5, "rvxdRngUniform", 5);
-  expect(rvxiRngUniform(0, stream_, 4, i.data(), 3, 3), -5, "rvxiRngUniform", 5);
-  // Bounds are looked at before the bits of the method.
-  expect(rvxsRngUniform(2, stream_, 4, f.data(), 1, 1), -5, "rvxsRngUniform", 5);
-  expect(rvxsRngUniform(0x40000001, stream_, 4, f.data(), 0, 1), -1, "rvxsRngUniform", 1);
-  expect(rvxdRngUniform(0x140000000, stream_, 4, d.data(), 0, 1), -1, "rvxdRngUniform", 1);
-  EXPECT_EQ(rvxsRngUniform(0, stream_, 0, nullptr, 1, 1), 0);
-  EXPECT_TRUE(f.untouched() && d.untouched() && i.untouched());
+TEST_F(arguments, methods_of_the_routines) {
+  int with_methods = 0;
+#define TARN_ROUTINE(name, value, methods, width, parameters_, arguments, check)               \
+  if (parameters::methods != parameters::any_method) {                                         \
+    check_methods<value>("rvx" #name, rvx##name, _rvx##name, good::name, parameters::methods); \
+    ++with_methods;                                                                            \
+  }
+#include "statistics/common/routines.def"
+  EXPECT_GT(with_methods, 0);
+}
+
+TEST_F(arguments, bad_parameters_with_a_bad_method) {
+  // Under the plain name the parameters are looked at before the bits of the method.
+  support::results<float> r(4);
+  expect(rvxsRngUniform(2, stream_, 4, r.data(), 1, 1), -5, "rvxsRngUniform", 5);
+  EXPECT_EQ(_rvxsRngUniform(2, stream_, 4, r.data(), 1, 1), -1);
+  EXPECT_TRUE(r.untouched());
 }
 
 TEST_F(arguments, making_streams) {
@@ -215,23 +257,11 @@ TEST(methods, of_integer_routines_are_taken_as_they_are) {
     EXPECT_EQ(x[i], y[i]);
 }
 
-TEST(raw_entries, are_safe_without_the_checks_in_front) {
+TEST(raw_entries, of_streams_are_safe_without_the_checks_in_front) {
   support::stream s;
   const unmarked bad;
-  support::results<float> f(4);
-  support::results<std::uint64_t> w(4);
   void* made = nullptr;
   std::uint8_t image[64] = {};
-  EXPECT_EQ(_rvxsRngUniform(3, s, 4, f.data(), 0, 1), -1);
-  EXPECT_EQ(_rvxsRngUniform(0, nullptr, 4, f.data(), 0, 1), -5);
-  EXPECT_EQ(_rvxsRngUniform(0, bad, 4, f.data(), 0, 1), -1006);
-  EXPECT_EQ(_rvxsRngUniform(0, s, -4, f.data(), 0, 1), -3);
-  EXPECT_EQ(_rvxsRngUniform(0, s, 4, nullptr, 0, 1), -4);
-  EXPECT_EQ(_rvxsRngUniform(0, s, 4, f.data(), 1, 1), -5);
-  EXPECT_EQ(_rvxsRngUniform(0, s, 4, f.data(), NAN, 1), -5);
-  EXPECT_EQ(_rvxiRngUniformBits64(-1, s, 4, w.data()), -1);
-  EXPECT_EQ(_rvxiRngUniformBits64(0, s, -1, w.data()), -3);
-  EXPECT_EQ(_rvxiRngUniformBits64(0, s, 1, nullptr), -4);
   EXPECT_EQ(__rvxNewStreamEx(nullptr, RVX_BRNG_PHILOX4X32X10, 0, nullptr), -5);
   EXPECT_EQ(__rvxNewStreamEx(&made, -1, 0, nullptr), -1000);
   EXPECT_EQ(__rvxNewStreamEx(&made, RVX_BRNG_PHILOX4X32X10, -1, nullptr), -3);
@@ -256,7 +286,6 @@ TEST(raw_entries, are_safe_without_the_checks_in_front) {
   EXPECT_EQ(__rvxLoadStreamF(nullptr, "x", -1), -5);
   EXPECT_EQ(__rvxLoadStreamF(&made, "x", -7), -3);
   EXPECT_EQ(made, nullptr);
-  EXPECT_TRUE(f.untouched() && w.untouched());
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Bad parameters of every routine: status -k, one report of position k, nothing written, and the
 // stream stays. The raw entries, without the checks in front, refuse the same.
+#include <deque>
 #include <functional>
 #include <limits>
 #include <set>
@@ -11,8 +12,6 @@ namespace {
 
 constexpr double nan_value = std::numeric_limits<double>::quiet_NaN();
 constexpr double infinite = std::numeric_limits<double>::infinity();
-constexpr float nan_float = std::numeric_limits<float>::quiet_NaN();
-constexpr float infinite_float = std::numeric_limits<float>::infinity();
 
 // A call of a routine with all its parameters, under its plain name or as raw entry.
 struct bad_call {
@@ -49,6 +48,17 @@ std::vector<Real> no_scales() {
   return bad;
 }
 
+// Bounds out of order, bounds that are not finite, and finite ones whose difference or sum is not.
+template <class Real>
+std::vector<std::pair<Real, Real>> no_bounds() {
+  constexpr Real most = std::numeric_limits<Real>::max();
+  std::vector<std::pair<Real, Real>> bad{
+      {1, 1}, {1, -1}, {-most, most}, {most / 2, most}, {-most, -most / 2}};
+  for (const Real x : no_places<Real>())
+    bad.insert(bad.end(), {{x, Real(1)}, {Real(0), x}, {x, x}, {x, -x}});
+  return bad;
+}
+
 #define BAD_PLACE_AND_SCALE(name, value)   \
   for (const value x : no_places<value>()) \
     BAD(name, value, 5, x, value(1));      \
@@ -77,14 +87,10 @@ void four_reals(bool second_is_place, const Add& add) {
 }
 
 void add_reals() {
-  BAD(sRngUniform, float, 5, 1.0f, 1.0f);
-  BAD(sRngUniform, float, 5, 2.0f, 1.0f);
-  BAD(sRngUniform, float, 5, nan_float, 1.0f);
-  BAD(sRngUniform, float, 5, 0.0f, nan_float);
-  BAD(sRngUniform, float, 5, infinite_float, infinite_float);
-  BAD(dRngUniform, double, 5, 1.0, 1.0);
-  BAD(dRngUniform, double, 5, 1.0, -1.0);
-  BAD(dRngUniform, double, 5, nan_value, nan_value);
+  for (const auto& ends : no_bounds<float>())
+    BAD(sRngUniform, float, 5, ends.first, ends.second);
+  for (const auto& ends : no_bounds<double>())
+    BAD(dRngUniform, double, 5, ends.first, ends.second);
   BAD_PLACE_AND_SCALE(sRngGaussian, float);
   BAD_PLACE_AND_SCALE(dRngGaussian, double);
   BAD_PLACE_AND_SCALE(sRngExponential, float);
@@ -117,22 +123,48 @@ void add_reals() {
     BAD(sRngChiSquare, float, 5, degrees);
     BAD(dRngChiSquare, double, 5, degrees);
   }
-  static const float f[4] = {1, 0, 0, 1};
-  static const double d[4] = {1, 0, 0, 1};
-  const float* const no_floats = nullptr;
-  const double* const no_doubles = nullptr;
-  for (const std::int32_t dimension : {0, -1}) {
-    BAD(sRngGaussianMV, float, 5, dimension, 0, f, f);
-    BAD(dRngGaussianMV, double, 5, dimension, 0, d, d);
-  }
-  for (const std::int32_t layout : {-1, 3}) {
-    BAD(sRngGaussianMV, float, 6, 2, layout, f, f);
-    BAD(dRngGaussianMV, double, 6, 2, layout, d, d);
-  }
-  BAD(sRngGaussianMV, float, 7, 2, 0, no_floats, f);
-  BAD(dRngGaussianMV, double, 7, 2, 0, no_doubles, d);
-  BAD(sRngGaussianMV, float, 8, 2, 0, f, no_floats);
-  BAD(dRngGaussianMV, double, 8, 2, 0, d, no_doubles);
+}
+
+// Numbers that calls of the table point to.
+template <class Real>
+const Real* kept(std::vector<Real> numbers) {
+  static std::deque<std::vector<Real>> all;
+  return all.emplace_back(std::move(numbers)).data();
+}
+
+// add(position, dimension, layout, mean, matrix), all of them for two dimensions.
+template <class Real, class Add>
+void vectors(const Add& add) {
+  const Real* const numbers = kept<Real>({1, 0, 0, 1});
+  const Real* const none = nullptr;
+  for (const std::int32_t dimension : {0, -1})
+    add(5, dimension, 0, numbers, numbers);
+  for (const std::int32_t layout : {-1, 3})
+    add(6, 2, layout, numbers, numbers);
+  add(7, 2, 0, none, numbers);
+  add(8, 2, 0, numbers, none);
+  // Entries that count: all but the one above the diagonal, three, two.
+  const std::vector<std::size_t> used[] = {{0, 2, 3}, {0, 1, 2}, {0, 1}};
+  for (const Real x : no_places<Real>())
+    for (const std::int32_t layout : {0, 1, 2}) {
+      add(7, 2, layout, kept<Real>({x, 0}), numbers);
+      add(7, 2, layout, kept<Real>({0, x}), numbers);
+      for (const std::size_t entry : used[layout]) {
+        std::vector<Real> matrix{1, 0, 0, 1};
+        matrix[entry] = x;
+        add(8, 2, layout, numbers, kept(matrix));
+      }
+    }
+}
+
+void add_vectors() {
+  vectors<float>(
+      [](int k, std::int32_t dimension, std::int32_t layout, const float* mean,
+         const float* matrix) { BAD(sRngGaussianMV, float, k, dimension, layout, mean, matrix); });
+  vectors<double>([](int k, std::int32_t dimension, std::int32_t layout, const double* mean,
+                     const double* matrix) {
+    BAD(dRngGaussianMV, double, k, dimension, layout, mean, matrix);
+  });
 }
 
 void add_integers() {
@@ -184,6 +216,7 @@ class parameters : public testing::Test {
  protected:
   static void SetUpTestSuite() {
     add_reals();
+    add_vectors();
     add_integers();
   }
   static void TearDownTestSuite() { table().clear(); }

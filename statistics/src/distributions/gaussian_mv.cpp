@@ -7,10 +7,12 @@ namespace tarn::statistics {
 template <class Real>
 triangular_factor<Real>::triangular_factor(std::int32_t layout, std::size_t dimension,
                                            const Real* matrix)
-    : diagonal_(layout == 2), data_(matrix) {
+    : diagonal_(layout == 2),
+      entries_(diagonal_ ? dimension : dimension * (dimension + 1) / 2),
+      data_(matrix) {
   if (layout != 0)
     return;
-  columns_.reserve(dimension * (dimension + 1) / 2);
+  columns_.reserve(entries_);
   for (std::size_t c = 0; c < dimension; ++c)
     for (std::size_t r = c; r < dimension; ++r)
       columns_.push_back(matrix[r * dimension + c]);

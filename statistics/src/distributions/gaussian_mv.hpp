@@ -20,9 +20,11 @@ class triangular_factor {
 
   bool diagonal() const { return diagonal_; }
   const Real* data() const { return data_; }
+  std::size_t entries() const { return entries_; }
 
  private:
   bool diagonal_;
+  std::size_t entries_;
   std::vector<Real> columns_;  // of layout 0
   const Real* data_;
 };

@@ -45,16 +45,13 @@ HWY_INLINE bool all_finite(D d, hn::Vec<D> x) {
   return hn::AllTrue(d, hn::Le(hn::Abs(x), hn::Set(d, std::numeric_limits<hn::TFromD<D>>::max())));
 }
 
-// sum(lowered numbers), raised again and clamped. What is not a number, by such a parameter, stays
-// so. Out of the way, for it is hardly ever wanted.
+// sum(lowered numbers), raised again and clamped. Out of the way, for it is hardly ever wanted.
 template <class D, class Sum>
 HWY_NOINLINE hn::Vec<D> clamped_sum(D d, const Sum& sum) {
   using real = hn::TFromD<D>;
   const auto greatest = hn::Set(d, std::numeric_limits<real>::max());
-  const auto least = hn::Neg(greatest);
   const auto raised = hn::Mul(sum(lowered()), hn::Set(d, static_cast<real>(1 / lowered::scale)));
-  const auto low = hn::IfThenElse(hn::Gt(raised, greatest), greatest, raised);
-  return hn::IfThenElse(hn::Lt(low, least), least, low);
+  return hn::Clamp(raised, hn::Neg(greatest), greatest);
 }
 
 // sum(numbers), without an overflow on the way.

@@ -55,7 +55,11 @@ int gaussian_mv(int method, void* stream, int n, Real* r, std::int32_t dimension
         bad != parameters::good)
       return -bad;
     const auto width = static_cast<std::size_t>(dimension);
+    if (!parameters::all_finite(mean, width))
+      return -7;
     const triangular_factor<Real> factor(layout, width, matrix);
+    if (!parameters::all_finite(factor.data(), factor.entries()))
+      return -8;
     const normal_end<Real> standard = gaussian_end<Real>(0, 1);
     switch (method) {
       case RVX_RNG_METHOD_GAUSSIAN_BOXMULLER:

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Shapes on both sides of 0.6 and of 1, where the methods change, and far from them.
+// Shapes on both sides of 0.6 and of 1, where the methods change, of 2^14 + 1/3, where the test
+// becomes a series, and far from them.
 #include "../reference.hpp"
 #include "../specimen.hpp"
 
@@ -10,9 +11,10 @@ namespace {
 template <class Real>
 void add(std::vector<specimen>& all) {
   const double sets[][3] = {
-      {0.05, 0, 1}, {0.3, 0, 1},  {0.59, 1, 2},   {0.6, 0, 1},  {0.601, 0, 1}, {0.61, -3, 0.1},
-      {0.8, 0, 5},  {0.99, 0, 1}, {0.9999, 0, 1}, {1, 0, 2},    {1, 5, 0.5},   {1.0001, 0, 1},
-      {1.05, 0, 1}, {2.5, 0, 2},  {7, 0, 1e-10},  {40, 1, 0.5}, {300.5, 0, 1}, {1e4, 0, 1e10}};
+      {0.05, 0, 1},  {0.3, 0, 1},   {0.59, 1, 2},   {0.6, 0, 1},  {0.601, 0, 1}, {0.61, -3, 0.1},
+      {0.8, 0, 5},   {0.99, 0, 1},  {0.9999, 0, 1}, {1, 0, 2},    {1, 5, 0.5},   {1.0001, 0, 1},
+      {1.05, 0, 1},  {2.5, 0, 2},   {7, 0, 1e-10},  {40, 1, 0.5}, {300.5, 0, 1}, {1e4, 0, 1e10},
+      {16384, 0, 1}, {16385, 0, 1}, {1e5, 0, 1}};
   for (const auto& set : sets) {
     const auto alpha = static_cast<Real>(set[0]);
     const auto a = static_cast<Real>(set[1]), beta = static_cast<Real>(set[2]);

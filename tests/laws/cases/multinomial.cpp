@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Few and many trials over few and many categories, with impossible categories too. Looked at: the
+// Few and many trials over few and many categories, with impossible categories too; 799 and 800
+// trials over three categories, where methods change (ntrial / 200 > categories). Looked at: the
 // first and the last count, the sum of the first half of them, and the sum of all.
 #include <numeric>
 #include <vector>
@@ -66,6 +67,8 @@ std::vector<specimen> multinomial_cases() {
           of(10, {0.2, 0.3, 0.1, 0.25, 0.15}),
           of(100, {1, 1, 1, 1}),
           of(1000, uneven(10)),
+          of(799, uneven(3)),
+          of(800, uneven(3)),
           of(50, {0, 0.5, 0, 0.5}),
           of(50, {0.5, 0.5, 0}),
           of(1000000, {0.7, 0.299, 0.001}),

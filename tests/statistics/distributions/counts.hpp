@@ -13,7 +13,6 @@
 #include <utility>
 #include <vector>
 
-#include <boost/math/distributions/chi_squared.hpp>
 #include <boost/math/special_functions/bernoulli.hpp>
 #include <boost/multiprecision/cpp_bin_float.hpp>
 #include <gtest/gtest.h>
@@ -286,42 +285,6 @@ inline void expect_constant(const draw& routine, std::int32_t value) {
     ASSERT_EQ(r[i], value);
   EXPECT_TRUE(r.guards_intact());
   EXPECT_TRUE(support::same_position(s, before));
-}
-
-// The probability of a fit at least as bad as that of n values to the law, by Pearson's chi-square
-// over cells of neighbouring values that expect at least n / 500 of them.
-inline double chi_square_tail(const draw& routine, const law& of, std::size_t n,
-                              std::uint64_t seed) {
-  support::stream s(seed);
-  std::vector<std::int32_t> r(n);
-  EXPECT_EQ(routine(s, static_cast<std::int64_t>(n), r.data()), 0);
-  std::sort(r.begin(), r.end());
-  const auto count = static_cast<double>(n);
-  auto from = r.begin();
-  double square = 0, left = count;
-  int cells = 0;
-  const auto close = [&](std::vector<std::int32_t>::iterator to, double expected) {
-    const double excess = static_cast<double>(to - from) - expected;
-    square += excess * excess / expected;
-    left -= expected;
-    from = to;
-    ++cells;
-  };
-  double expected = 0;
-  for (std::int64_t y = r.front(); y <= r.back(); ++y) {
-    // What lies below the least value belongs to the first cell, what lies above to the last.
-    if (y == r.front())
-      for (std::int64_t below = y - 1; below >= of.least && of.ratio(below) > 1e-12; --below)
-        expected += count * static_cast<double>(exp(of.log_at(below)));
-    expected += count * static_cast<double>(exp(of.log_at(y)));
-    if (expected < count / 500 || left - expected < count / 500)
-      continue;
-    close(std::upper_bound(from, r.end(), y), expected);
-    expected = 0;
-  }
-  close(r.end(), left);
-  EXPECT_GT(cells, 1);
-  return cdf(complement(boost::math::chi_squared(cells - 1), square));
 }
 
 }  // namespace counts

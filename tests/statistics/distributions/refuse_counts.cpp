@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// What poisson, poisson_v, bernoulli, geometric, multinomial and gaussian_mv refuse: with the
-// number of the argument, nothing written, and the stream where it was. By the raw entries too,
-// which callers reach without the checks in front.
+// What poisson, poisson_v, bernoulli, geometric and multinomial refuse: with the number of the
+// argument, nothing written, and the stream where it was. By the raw entries too, which callers
+// reach without the checks in front.
 #include <cmath>
 #include <functional>
 #include <limits>
@@ -97,35 +97,6 @@ TEST(refuse_counts, the_tolerance_of_the_sum) {
     const bool within = std::fabs(error) <= 3 * 0x1p-49;
     EXPECT_EQ(rvxiRngMultinomial(0, s, 1, r, 5, 3, p), within ? 0 : -7) << error;
   }
-}
-
-template <class Real, class Plain, class Raw>
-void refuse_vectors(const Plain& plain_entry, const Raw& raw_entry) {
-  const Real numbers[9] = {1, 0, 0, 0, 1, 0, 0, 0, 1};
-  const auto refused = [&](int status, int method, std::int32_t d, std::int32_t layout,
-                           const Real* mean, const Real* matrix) {
-    const support::reports quiet;
-    support::stream s(1);
-    const plain::stream before = s.position();
-    support::results<Real> r(64);
-    EXPECT_EQ(plain_entry(method, s, 4, r.data(), d, layout, mean, matrix), status);
-    EXPECT_EQ(raw_entry(method, s, 4, r.data(), d, layout, mean, matrix), status);
-    EXPECT_TRUE(r.untouched());
-    EXPECT_TRUE(support::same_position(s, before));
-  };
-  for (const int method : {3, 4, 7, 0x40000000})
-    refused(-1, method, 3, 0, numbers, numbers);
-  refused(-5, 0, 0, 0, numbers, numbers);
-  refused(-5, 0, -3, 0, numbers, numbers);
-  refused(-6, 0, 3, -1, numbers, numbers);
-  refused(-6, 0, 3, 3, numbers, numbers);
-  refused(-7, 0, 3, 0, nullptr, numbers);
-  refused(-8, 0, 3, 0, numbers, nullptr);
-}
-
-TEST(refuse_counts, gaussian_mv) {
-  refuse_vectors<float>(rvxsRngGaussianMV, _rvxsRngGaussianMV);
-  refuse_vectors<double>(rvxdRngGaussianMV, _rvxdRngGaussianMV);
 }
 
 // A sequence that ends: too few words for the whole call.
