@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-// generate over the rows with a device road, on every device: what a whole call costs, from one
-// result (the cost of the frame) to 16 million. Names read device/engine/distribution/n.
+// generate on every device: what a whole call costs. Each row with a device road on philox4x32x10,
+// from one result (the cost of the frame) to 4 million; and each engine with one, on the uniform
+// distribution. Names read device/engine/distribution/n.
 #include <cstdlib>
 #include <cstring>
+#include <initializer_list>
 #include <string>
 
 #include <kestrel/tarn/rng.hpp>
@@ -48,25 +50,34 @@ void memory_set(benchmark::State& state) {
 }
 
 template <typename Engine, typename Distr>
-void register_row(const std::string& engine, const std::string& distr, const sycl::device& device) {
+void register_call(const std::string& engine, const std::string& distr, const sycl::device& device,
+                   std::initializer_list<std::int64_t> counts) {
   const std::string name = std::string(device.is_cpu() ? "cpu/" : "gpu/") + engine + "/" + distr;
-  benchmark::RegisterBenchmark(
-      name.c_str(), [device](benchmark::State& state) { draw<Engine, Distr>(state, device); })
-      ->Arg(1)
-      ->Arg(1000)
-      ->Arg(1 << 16)
-      ->Arg(4000000)
-      ->Arg(1 << 24)
-      ->UseRealTime();
+  auto* registered = benchmark::RegisterBenchmark(
+      name.c_str(), [device](benchmark::State& state) { draw<Engine, Distr>(state, device); });
+  for (const std::int64_t n : counts) {
+    registered->Arg(n);
+  }
+  registered->UseRealTime();
 }
 
-template <typename Engine>
-void register_engine(const std::string& engine, const sycl::device& device) {
-#define TARN_REGISTER(...) register_row<Engine, __VA_ARGS__>(engine, #__VA_ARGS__, device);
+void register_rows(const sycl::device& device) {
+  using namespace rng;
+#define TARN_REGISTER(...)                                                         \
+  register_call<philox4x32x10, __VA_ARGS__>("philox4x32x10", #__VA_ARGS__, device, \
+                                            {1, 1000, 4000000});
 #define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
   TARN_IF_##built(TARN_REGISTER type)
-  using namespace rng;
 #include "distributions/distributions.def"
+}
+
+void register_engines(const sycl::device& device) {
+#define TARN_REGISTER_ENGINE(name) \
+  register_call<rng::name, rng::uniform<>>(#name, "uniform<>", device, {4000000, 1 << 24});
+#define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
+                    uniform_bits, built)                                                     \
+  TARN_IF_##built(TARN_REGISTER_ENGINE(name))
+#include "engines/engines.def"
 }
 
 }  // namespace
@@ -75,11 +86,8 @@ int main(int argc, char** argv) {
   setenv("LUMEN_VIRTUAL_DEVICES", "gpu", 0);
   benchmark::RegisterBenchmark("memory_set", memory_set)->Arg(4000000)->Arg(1 << 24)->UseRealTime();
   for (const sycl::device& device : sycl::device::get_devices()) {
-#define TARN_REGISTER_ENGINE(name) register_engine<rng::name>(#name, device);
-#define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
-  TARN_IF_##built(TARN_REGISTER_ENGINE(name))
-#include "engines/engines.def"
+    register_rows(device);
+    register_engines(device);
   }
   benchmark::Initialize(&argc, argv);
   benchmark::RunSpecifiedBenchmarks();

@@ -1,9 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // uniform, bits and uniform_bits on both roads: the kernel functors, and the routines of the
 // statistics library.
-//
-// A kernel functor takes four numbers of its source type and gives its results; `source` says
-// what the engine delivers: reals of [lo(), hi()) by the engine's word-to-real rule, or raw words.
 #pragma once
 
 #include <cstdint>
@@ -15,6 +12,7 @@
 #include <sycl/sycl.hpp>
 
 #include "distributions/host_routine.hpp"
+#include "distributions/kernel_functor.hpp"
 #include "distributions/uniform_integers.hpp"
 
 namespace kestrel::tarn::rng::detail::gpu {
@@ -39,14 +37,14 @@ SYCL_EXTERNAL Integer floor_to_integer(Real x) {
 template <typename T, typename R>
 struct uniform_std {
   using source = R;
+  static constexpr drawn asks = drawn::reals;
   static constexpr int results = 4;
 
   R a;
   R b;
   std::uint8_t accurate;
 
-  R lo() const { return a; }
-  R hi() const { return b; }
+  real_range<R> range() const { return {a, b}; }
 
   SYCL_EXTERNAL sycl::vec<T, results> operator()(const sycl::vec<R, 4>& x) const {
     sycl::vec<T, results> out;
@@ -66,28 +64,36 @@ struct uniform_std {
   }
 };
 
-/// Raw engine words.
-template <typename UIntType>
-struct bits_std {
+/// Words as they are delivered.
+template <drawn what>
+struct words_std {
   using source = std::uint32_t;
+  static constexpr drawn asks = what;
   static constexpr int results = 4;
 
-  SYCL_EXTERNAL sycl::vec<UIntType, results> operator()(
+  SYCL_EXTERNAL sycl::vec<std::uint32_t, results> operator()(
       const sycl::vec<std::uint32_t, 4>& words) const {
     return words;
   }
 };
+
+/// Engine words.
+template <typename UIntType>
+struct bits_std;
+template <>
+struct bits_std<std::uint32_t> : words_std<drawn::words> {};
 
 /// Equidistributed words: one word a result, or two with the first in the low half.
 template <typename UIntType>
 struct uniform_bits_std;
 
 template <>
-struct uniform_bits_std<std::uint32_t> : bits_std<std::uint32_t> {};
+struct uniform_bits_std<std::uint32_t> : words_std<drawn::bits> {};
 
 template <>
 struct uniform_bits_std<std::uint64_t> {
   using source = std::uint32_t;
+  static constexpr drawn asks = drawn::bits;
   static constexpr int results = 2;
 
   SYCL_EXTERNAL sycl::vec<std::uint64_t, results> operator()(

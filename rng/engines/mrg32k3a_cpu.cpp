@@ -18,33 +18,36 @@ mrg32k3a::mrg32k3a(sycl::queue queue_, std::initializer_list<std::uint32_t> seed
 
 namespace {
 
-[[noreturn]] void refuse_mode(const sycl::queue& queue) {
-  if (queue.get_device().is_gpu()) {
-    throw unimplemented("rng", "mrg32k3a", "sub-sequence modes");
+template <typename... Arguments>
+detail::owned_impl<mrg32k3a> impl_on_gpu(sycl::queue& queue, Arguments... arguments) {
+  if (!queue.get_device().is_gpu()) {
+    throw unsupported_device("rng", "mrg32k3a", queue.get_device());
   }
-  throw unsupported_device("rng", "mrg32k3a", queue.get_device());
+  return detail::owned_impl<mrg32k3a>(detail::gpu::create_engine<mrg32k3a>(queue, arguments...));
 }
 
 }  // namespace
 
-mrg32k3a::mrg32k3a(sycl::queue queue_, std::uint32_t, mrg32k3a_mode::optimal)
+mrg32k3a::mrg32k3a(sycl::queue queue_, std::uint32_t seed, mrg32k3a_mode::optimal mode)
     : engine_base(std::move(queue_)) {
-  refuse_mode(queue);
+  impl = impl_on_gpu(queue, seed, mode);
 }
 
-mrg32k3a::mrg32k3a(sycl::queue queue_, std::uint32_t, mrg32k3a_mode::custom)
+mrg32k3a::mrg32k3a(sycl::queue queue_, std::uint32_t seed, mrg32k3a_mode::custom mode)
     : engine_base(std::move(queue_)) {
-  refuse_mode(queue);
+  impl = impl_on_gpu(queue, seed, mode);
 }
 
-mrg32k3a::mrg32k3a(sycl::queue queue_, std::initializer_list<std::uint32_t>, mrg32k3a_mode::optimal)
+mrg32k3a::mrg32k3a(sycl::queue queue_, std::initializer_list<std::uint32_t> seed,
+                   mrg32k3a_mode::optimal mode)
     : engine_base(std::move(queue_)) {
-  refuse_mode(queue);
+  impl = impl_on_gpu(queue, detail::count_of(seed), seed.begin(), mode);
 }
 
-mrg32k3a::mrg32k3a(sycl::queue queue_, std::initializer_list<std::uint32_t>, mrg32k3a_mode::custom)
+mrg32k3a::mrg32k3a(sycl::queue queue_, std::initializer_list<std::uint32_t> seed,
+                   mrg32k3a_mode::custom mode)
     : engine_base(std::move(queue_)) {
-  refuse_mode(queue);
+  impl = impl_on_gpu(queue, detail::count_of(seed), seed.begin(), mode);
 }
 
 }  // namespace kestrel::tarn::rng

@@ -10,6 +10,7 @@
 #include <sycl/sycl.hpp>
 
 #include "engines/engine_traits.hpp"
+#include "frame/engine_backend.hpp"
 
 namespace kestrel::tarn::rng::detail {
 
@@ -144,21 +145,25 @@ template <>
 struct engine_traits<philox4x32x10> {
   using record = tag_rvx_sycl_brng_philox4x32x10_stream_t;
 
-  /// A word is read as a signed number, so the offset is the middle of the range.
+  /// Scale and offset. A word is read as a signed number, so the offset is the middle of the range.
   template <typename Real>
-  static Real scale(Real lo, Real hi) {
-    return (hi - lo) * static_cast<Real>(0x1p-32);
-  }
-  template <typename Real>
-  static Real offset(Real lo, Real hi) {
-    return (lo + hi) * static_cast<Real>(0.5);
+  static word_rule<Real> rule(gpu::real_range<Real> range) {
+    return {(range.hi - range.lo) * static_cast<Real>(0x1p-32),
+            (range.lo + range.hi) * static_cast<Real>(0.5)};
   }
 
-  template <typename T>
-  SYCL_EXTERNAL static void four(record* state, std::uint64_t block, sycl::vec<T, 4>& out, T a,
-                                 T b) {
-    philox4x32x10_generate<T>(state, block, out, a, b);
+  /// A word has 32 equidistributed bits, so that words and bits are the same.
+  template <gpu::drawn asks, typename R>
+  SYCL_EXTERNAL static void four(record* state, std::uint64_t block, sycl::vec<R, 4>& out,
+                                 word_rule<R> rule) {
+    philox4x32x10_generate<R>(state, block, out, rule.a, rule.b);
   }
+};
+
+template <>
+class engine_base_impl_backend<philox4x32x10, device_type::gpu>
+    : public snapshot_backend<philox4x32x10> {
+  using snapshot_backend<philox4x32x10>::snapshot_backend;
 };
 
 }  // namespace kestrel::tarn::rng::detail

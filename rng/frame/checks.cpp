@@ -50,4 +50,8 @@ void refuse_device_road(const char* name, const char* kind) {
   throw unimplemented("rng", "generate", std::string(name) + " " + kind + " on a GPU");
 }
 
+void refuse_ptpe() {
+  throw unimplemented("rng", "generate", "poisson distribution with ptpe method on a GPU device");
+}
+
 }  // namespace kestrel::tarn::rng::detail

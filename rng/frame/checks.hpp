@@ -30,7 +30,7 @@ std::int64_t values_per_result(const multinomial<T, Method>& distr) {
 }
 template <typename Engine>
 std::int64_t values_per_result(const bits<std::uint32_t>&) {
-  return (engine_row<Engine>::word_bits + 31) / 32;
+  return engine_row<Engine>::stored_words;
 }
 
 /// Raise invalid_argument: "n" first, then "r". A buffer must hold every value that the call
@@ -65,6 +65,28 @@ device_type road_of(const sycl::queue& queue);
 
 /// For what is meant for GPUs and has no device road yet.
 [[noreturn]] void refuse_device_road(const char* name, const char* kind);
+
+/// The families that an engine split into sub-sequences draws.
+template <typename Distr>
+inline constexpr bool runs_in_sub_sequences = false;
+template <typename T, typename Method>
+inline constexpr bool runs_in_sub_sequences<uniform<T, Method>> = true;
+template <typename T, typename Method>
+inline constexpr bool runs_in_sub_sequences<gaussian<T, Method>> = true;
+
+/// Raises invalid_argument where the engine is split and the distribution is not one of those.
+template <typename Engine>
+void check_mode(engine_base_impl<Engine>*, bool /*runs_in_sub_sequences*/) {}
+template <>
+void check_mode(engine_base_impl<mrg32k3a>* engine, bool runs_in_sub_sequences);
+
+/// Rejection by PTPE has no device form: on a GPU poisson is drawn by its other method alone.
+template <typename Distr>
+inline constexpr bool is_host_method = false;
+template <typename IntType>
+inline constexpr bool is_host_method<poisson<IntType, poisson_method::ptpe>> = true;
+
+[[noreturn]] void refuse_ptpe();
 
 template <typename Distr>
 inline constexpr bool is_uniform_bits = false;

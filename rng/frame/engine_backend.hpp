@@ -38,10 +38,11 @@ class engine_base_impl_backend<Engine, device_type::cpu> : public engine_base_im
   using engine_base_impl<Engine>::engine_base_impl;
 };
 
-/// The device road of engines whose state travels to each kernel by value. Engines with state on
-/// the device specialise.
+/// The backend on GPUs of engines whose state travels to each kernel by value. Which engines have
+/// one is said by the specialisations of engine_base_impl_backend for device_type::gpu, next to
+/// their stepping; engines without a device road have none.
 template <typename Engine>
-class engine_base_impl_backend<Engine, device_type::gpu> : public engine_base_impl<Engine> {
+class snapshot_backend : public engine_base_impl<Engine> {
  public:
   using engine_base_impl<Engine>::engine_base_impl;
 

@@ -25,32 +25,31 @@ owned_impl<Engine> impl_from(sycl::queue& queue, Seed... seed) {
                       queue);
 }
 
-/// From a stream that `make_stream` makes: for constructors without a device road.
-template <typename Engine, typename MakeStream>
-owned_impl<Engine> impl_on_cpu(sycl::queue& queue, MakeStream make_stream) {
-  static_assert(!engine_row<Engine>::device_road, "this constructor needs a device road");
-  const auto no_gpu = []() -> engine_base_impl<Engine>* { return nullptr; };
-  return require_impl(make_impl<Engine>(queue, make_stream, no_gpu), queue);
-}
-
 /// Member `engine_idx` of a set of `members` engines, from a scalar seed or from words.
 template <typename Engine, typename... Seed>
 owned_impl<Engine> impl_of_member(sycl::queue& queue, std::uint32_t members,
                                   std::uint32_t engine_idx, Seed... seed) {
-  return impl_on_cpu<Engine>(queue, [&] {
-    return new_stream(member_code(engine_row<Engine>::code, engine_idx, members), seed...);
-  });
+  const auto code = [=] { return member_code(engine_row<Engine>::code, engine_idx, members); };
+  const auto on_gpu = [&] {
+    code();  // for its check
+    return gpu::create_engine<Engine>(queue, seed..., engine_idx);
+  };
+  return require_impl(make_impl<Engine>(
+                          queue, [&] { return new_stream(code(), seed...); }, on_gpu),
+                      queue);
 }
 
-/// From a table of the caller's, which keeps the `header` that the stream needs in front of it.
+/// From a table of the caller's, which comes back with the `header` that the stream needs in front
+/// of it, and as it was when no engine can be made.
 template <typename Engine>
 owned_impl<Engine> impl_from_table(sycl::queue& queue, std::vector<std::uint32_t>& table,
                                    const std::array<std::uint32_t, 3>& header) {
-  return impl_on_cpu<Engine>(queue, [&] {
-    table.insert(table.begin(), header.begin(), header.end());
-    return new_stream(engine_row<Engine>::code, static_cast<std::int64_t>(table.size()),
-                      table.data());
-  });
+  std::vector<std::uint32_t> headed(header.begin(), header.end());
+  headed.insert(headed.end(), table.begin(), table.end());
+  const auto n = static_cast<std::int64_t>(headed.size());
+  owned_impl<Engine> impl = impl_from<Engine>(queue, n, headed.data());
+  table.swap(headed);
+  return impl;
 }
 
 /// The count of a list's items, as streams take it.

@@ -24,10 +24,13 @@ template <typename Distr, typename Engine, typename Out>
 sycl::event generate_on_gpu(sycl::queue& queue, const Distr& distr, engine_base_impl<Engine>* impl,
                             std::int64_t n, Out r, const std::vector<sycl::event>& dependencies) {
   using row = distribution_row<Distr>;
+  check_mode(impl, runs_in_sub_sequences<Distr>);
   if constexpr (!engine_row<Engine>::gpu) {
     refuse_device(queue);
   } else if constexpr (!engine_row<Engine>::device_road) {
     refuse_device_road(engine_row<Engine>::name, "engine");
+  } else if constexpr (is_host_method<Distr>) {
+    refuse_ptpe();
   } else if constexpr (!row::device_road) {
     refuse_device_road(row::family, "distribution");
   } else if constexpr (row::entry == device_entry::generate_ex) {

@@ -25,6 +25,7 @@ struct engine_row;
     static constexpr const char* name = #name_;                                                  \
     static constexpr std::int64_t code = code_;                                                  \
     static constexpr int word_bits = word_bits_;                                                 \
+    static constexpr int stored_words = (word_bits_ + 31) / 32;                                  \
     static constexpr bool gpu = gpu_;                                                            \
     static constexpr bool device_road = built;                                                   \
     static constexpr bool uniform_bits = uniform_bits_;                                          \

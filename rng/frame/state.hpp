@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <string>
 
+#include <kestrel/tarn/rng/engines.hpp>
 #include <kestrel/tarn/rng/functions.hpp>
 #include <sycl/sycl.hpp>
 
@@ -15,6 +16,29 @@
 namespace kestrel::tarn::rng {
 
 namespace detail {
+
+/// Engines with an image of their state on the device bring the record in the stream up to date
+/// before `service` reads it, and the image after a record has been loaded. Where no stream can
+/// hold the state the first raises computation_error in the name of the service. Nothing is done
+/// for an implementation that was made on a CPU queue.
+template <typename Engine>
+void image_to_stream(engine_base_impl<Engine>*, const char* /*service*/) {}
+template <typename Engine>
+void image_from_stream(sycl::queue&, engine_base_impl<Engine>*) {}
+template <>
+void image_to_stream(engine_base_impl<mrg32k3a>* engine, const char* service);
+template <>
+void image_to_stream(engine_base_impl<mt19937>* engine, const char* service);
+template <>
+void image_from_stream(sycl::queue& queue, engine_base_impl<mt19937>* engine);
+template <>
+void image_to_stream(engine_base_impl<mt2203>* engine, const char* service);
+template <>
+void image_from_stream(sycl::queue& queue, engine_base_impl<mt2203>* engine);
+template <>
+void image_to_stream(engine_base_impl<sobol>* engine, const char* service);
+template <>
+void image_from_stream(sycl::queue& queue, engine_base_impl<sobol>* engine);
 
 /// Raise computation_error with the texts of each service.
 std::int64_t stream_size(rvx_stream stream);
@@ -34,27 +58,33 @@ std::int64_t get_state_size(Engine& engine) {
 
 template <typename Engine>
 void save_state(Engine& engine, std::uint8_t* mem) {
-  detail::save_stream(detail::engine_access::impl(engine)->stream.get(), mem);
+  auto* impl = detail::engine_access::impl(engine);
+  detail::image_to_stream(impl, "save_state");
+  detail::save_stream(impl->stream.get(), mem);
 }
 
 template <typename Engine>
 void save_state(Engine& engine, const std::string& filename) {
-  detail::save_stream(detail::engine_access::impl(engine)->stream.get(), filename);
+  auto* impl = detail::engine_access::impl(engine);
+  detail::image_to_stream(impl, "save_state");
+  detail::save_stream(impl->stream.get(), filename);
 }
 
 template <typename Engine>
 Engine load_state(const sycl::queue& queue, const std::uint8_t* mem) {
   Engine engine(queue);
-  detail::load_stream(detail::engine_access::impl(engine)->stream, detail::engine_row<Engine>::code,
-                      mem);
+  auto* impl = detail::engine_access::impl(engine);
+  detail::load_stream(impl->stream, detail::engine_row<Engine>::code, mem);
+  detail::image_from_stream(engine.get_queue(), impl);
   return engine;
 }
 
 template <typename Engine>
 Engine load_state(const sycl::queue& queue, const std::string& filename) {
   Engine engine(queue);
-  detail::load_stream(detail::engine_access::impl(engine)->stream, detail::engine_row<Engine>::code,
-                      filename);
+  auto* impl = detail::engine_access::impl(engine);
+  detail::load_stream(impl->stream, detail::engine_row<Engine>::code, filename);
+  detail::image_from_stream(engine.get_queue(), impl);
   return engine;
 }
 

@@ -8,7 +8,8 @@ cmake_minimum_required(VERSION 3.25)
 set(headers
   core/include/tarn_serv.h core/src/memory.hpp
   lumen/include/sycl/sycl.hpp lumen/include/sycl/detail/task.hpp lumen/src/lumen_pool.hpp
-  statistics/include/tarn_rvx.h statistics/src/block.hpp
+  statistics/include/tarn_rvx.h statistics/src/block.hpp statistics/common/erfinv_tables.hpp
+  statistics/common/parameters.hpp
   forge/encoder.hpp service/device_table.hpp
   rng/include/kestrel/tarn/rng.hpp rng/engines/engines.def rng/frame/launch.hpp
   offload/entries.hpp tests/laws/law.hpp bench/driver.hpp examples/helper.hpp tools/table.hpp)
@@ -44,6 +45,7 @@ set(forge "\"encoder.hpp\"")
 set(offload "\"offload/entries.hpp\"")
 set(core_private "\"core/src/memory.hpp\"")
 set(statistics_private "\"../statistics/src/block.hpp\"")
+set(kernel_tables "\"statistics/common/erfinv_tables.hpp\"")
 set(lumen_private "\"lumen_pool.hpp\"" "<lumen/src/lumen_pool.hpp>" "\"sycl/detail/task.hpp\""
     "\"detail/task.hpp\"")
 
@@ -72,6 +74,12 @@ expect(CAUGHT service/own.cpp ${rvx} ${rng_public} ${rng_private} ${offload} ${c
 expect(PASSED rng/engines/own.cpp ${serv} ${sycl} ${rvx} ${service} ${rng_private} ${rng_public})
 expect(CAUGHT rng/engines/own.cpp ${forge} ${offload} ${core_private} ${statistics_private}
        ${lumen_private})
+
+expect(PASSED rng/distributions/own.hpp ${kernel_tables})  # data, the one exception
+expect(CAUGHT rng/distributions/own.hpp "\"statistics/common/parameters.hpp\"")
+foreach(folder core lumen forge service offload)
+  expect(CAUGHT ${folder}/own.cpp ${kernel_tables})
+endforeach()
 
 expect(PASSED offload/own.cpp ${serv} ${sycl} ${rvx} ${service} ${rng_private} ${rng_public})
 expect(CAUGHT offload/own.cpp ${forge} ${core_private} ${statistics_private} ${lumen_private})

@@ -32,11 +32,12 @@ bool same_bits(const T& x, const T& y) {
   return std::memcmp(&x, &y, sizeof x) == 0;
 }
 
-/// Draws `n` results into USM, waits, checks the guards and returns the results.
+/// Draws `n` results of as many values each into USM, waits, checks the guards and returns the
+/// values.
 template <typename Distr, typename Engine>
-auto draw(const Distr& distr, Engine& engine, std::int64_t n) {
+auto draw(const Distr& distr, Engine& engine, std::int64_t n, std::size_t values_per_result = 1) {
   using T = typename Distr::result_type;
-  const auto count = static_cast<std::size_t>(n);
+  const std::size_t count = static_cast<std::size_t>(n) * values_per_result;
   sycl::queue& queue = engine.get_queue();
   T* memory = sycl::malloc_shared<T>(count + guard_size, queue);
   for (std::size_t i = 0; i < count + guard_size; ++i) {
@@ -53,9 +54,10 @@ auto draw(const Distr& distr, Engine& engine, std::int64_t n) {
 
 /// The same into a buffer that is longer than `n`.
 template <typename Distr, typename Engine>
-auto draw_into_buffer(const Distr& distr, Engine& engine, std::int64_t n) {
+auto draw_into_buffer(const Distr& distr, Engine& engine, std::int64_t n,
+                      std::size_t values_per_result = 1) {
   using T = typename Distr::result_type;
-  const auto count = static_cast<std::size_t>(n);
+  const std::size_t count = static_cast<std::size_t>(n) * values_per_result;
   std::vector<T> values(count + guard_size, marker<T>());
   {
     sycl::buffer<T, 1> buffer(values.data(), sycl::range<1>(values.size()));

@@ -3,8 +3,6 @@
 // cleared stands for whatever makes a service fail.
 #include <cstdint>
 #include <string>
-#include <tarn_serv.h>
-#include <vector>
 
 #include <kestrel/tarn/rng.hpp>
 
@@ -14,6 +12,7 @@
 #include "frame/engine_backend.hpp"
 #include "message.hpp"
 #include "queues.hpp"
+#include "silence.hpp"
 
 namespace {
 
@@ -22,6 +21,7 @@ namespace rng = kestrel::tarn::rng;
 using engine_type = rng::philox4x32x10;
 using tarn_test::draw;
 using tarn_test::marker;
+using tarn_test::silence;
 
 /// Takes the mark off an engine's stream for as long as it lives.
 class spoiled {
@@ -42,17 +42,12 @@ class spoiled {
 
 class failing_service : public tarn_test::over_queues {
  protected:
-  void SetUp() override {
-    tarn_serv_set_xerbla_interface(reinterpret_cast<void*>(+[](const char*, const int*, int) {}),
-                                   0);
-  }
-  void TearDown() override { tarn_serv_set_xerbla_interface(nullptr, 1); }
-
   template <typename Call>
   static std::string failure(Call call) {
     return tarn_test::message_of<tarn::computation_error>(call);
   }
 
+  const silence reports;
   engine_type engine{queue(), 7};
 };
 TARN_OVER_QUEUES(failing_service);
@@ -101,17 +96,6 @@ TEST_P(failing_service, generate_writes_nothing) {
                         ? "kestrel::tarn::rng::skip_ahead: computation error"
                         : "[nothing raised]");
   EXPECT_TRUE(tarn_test::same_bits(value, marker<float>()));
-}
-
-TEST(loading, on_a_device_without_a_road_is_refused_like_construction) {
-  engine_type engine(tarn_test::cpu_queue(), 7);
-  std::vector<std::uint8_t> image(static_cast<std::size_t>(rng::get_state_size(engine)));
-  rng::save_state(engine, image.data());
-  const sycl::queue queue = tarn_test::accelerator_queue();
-  EXPECT_EQ(tarn_test::message_of<tarn::unsupported_device>(
-                [&] { rng::load_state<engine_type>(queue, image.data()); }),
-            "kestrel::tarn::rng::philox4x32x10: unsupported device: " +
-                queue.get_device().get_info<sycl::info::device::name>());
 }
 
 }  // namespace

@@ -162,14 +162,17 @@ TEST(launch, has_one_work_item_for_each_started_block) {
 }
 
 TEST(philox_rule, scale_and_offset_of_the_unit_interval_are_exact) {
-  using traits = detail::engine_traits<kestrel::tarn::rng::philox4x32x10>;
-  const float scale = traits::scale(0.0f, 1.0f);
+  const auto rule_of = [](auto lo, auto hi) {
+    return detail::engine_traits<kestrel::tarn::rng::philox4x32x10>::rule(
+        detail::gpu::real_range<decltype(lo)>{lo, hi});
+  };
+  const float scale = rule_of(0.0f, 1.0f).a;
   std::uint32_t pattern;
   std::memcpy(&pattern, &scale, sizeof pattern);
   EXPECT_EQ(pattern, 0x2F800000u);
-  EXPECT_EQ(traits::scale(0.0, 1.0), 2.3283064365386963e-10);
-  EXPECT_EQ(traits::offset(0.0f, 1.0f), 0.5f);
-  EXPECT_EQ(traits::offset(-3.0, 5.0), 1.0);
+  EXPECT_EQ(rule_of(0.0, 1.0).a, 2.3283064365386963e-10);
+  EXPECT_EQ(rule_of(0.0f, 1.0f).b, 0.5f);
+  EXPECT_EQ(rule_of(-3.0, 5.0).b, 1.0);
 }
 
 }  // namespace

@@ -163,6 +163,7 @@ TEST(seeds, of_sobol_may_be_direction_numbers) {
 
   words torn(31, 1);
   EXPECT_EQ(message_of<tarn::computation_error>([&] { rng::sobol(cpu(), torn); }), not_made);
+  EXPECT_EQ(torn, words(31, 1));
 }
 
 TEST(seeds, of_niederreiter_may_be_polynomials) {
@@ -174,6 +175,7 @@ TEST(seeds, of_niederreiter_may_be_polynomials) {
   words reducible = {2, 5};  // t^2 + 1 = (t + 1)^2
   EXPECT_EQ(message_of<tarn::computation_error>([&] { rng::niederreiter(cpu(), reducible); }),
             not_made);
+  EXPECT_EQ(reducible, (words{2, 5}));
 }
 
 TEST(seeds, that_no_stream_can_be_made_of_are_refused) {

@@ -11,6 +11,7 @@
 #include <kestrel/tarn/export.hpp>
 #include <sycl/sycl.hpp>
 
+/// The libraries of the house.
 namespace kestrel::tarn {
 
 /// Base of all exceptions of the library. Copies share the message and do not throw.
@@ -19,9 +20,13 @@ class TARN_EXPORT exception : public std::exception {
   /// Each of the three strings may be empty; an empty one leaves out its separator.
   exception(const std::string& library, const std::string& function, const std::string& text);
   ~exception() override;
+  ///@{
+  /// Shares the message.
   exception(const exception&) noexcept = default;
   exception& operator=(const exception&) noexcept = default;
+  ///@}
 
+  /// The message.
   const char* what() const noexcept override;
 
  private:
@@ -31,6 +36,7 @@ class TARN_EXPORT exception : public std::exception {
 /// An argument outside its range; the text names it.
 class TARN_EXPORT invalid_argument : public exception {
  public:
+  /// Composed as the base tells, with the kind before `text`.
   invalid_argument(const std::string& library, const std::string& function,
                    const std::string& text);
   ~invalid_argument() override;
@@ -39,6 +45,7 @@ class TARN_EXPORT invalid_argument : public exception {
 /// A computation could not be started or finished.
 class TARN_EXPORT computation_error : public exception {
  public:
+  /// Composed as the base tells, with the kind before `text`.
   computation_error(const std::string& library, const std::string& function,
                     const std::string& text);
   ~computation_error() override;
@@ -47,6 +54,7 @@ class TARN_EXPORT computation_error : public exception {
 /// A combination that is not offered.
 class TARN_EXPORT unimplemented : public exception {
  public:
+  /// Composed as the base tells, with the kind before `text`.
   unimplemented(const std::string& library, const std::string& function, const std::string& text);
   ~unimplemented() override;
 };
@@ -54,6 +62,7 @@ class TARN_EXPORT unimplemented : public exception {
 /// The device cannot run this; the message ends with the device's name.
 class TARN_EXPORT unsupported_device : public exception {
  public:
+  /// Composed as the base tells; the text is the kind and the name of `device`.
   unsupported_device(const std::string& library, const std::string& function,
                      const sycl::device& device);
   ~unsupported_device() override;
@@ -62,6 +71,7 @@ class TARN_EXPORT unsupported_device : public exception {
 /// Memory of a device is exhausted; the message ends with the device's name.
 class TARN_EXPORT device_bad_alloc : public exception {
  public:
+  /// Composed as the base tells; the text is the kind and the name of `device`.
   device_bad_alloc(const std::string& library, const std::string& function,
                    const sycl::device& device);
   ~device_bad_alloc() override;
@@ -70,6 +80,7 @@ class TARN_EXPORT device_bad_alloc : public exception {
 /// A failed batch of the device service layer; random-number functions never raise it.
 class TARN_EXPORT batch_error : public exception {
  public:
+  /// Composed as the base tells; the text is the kind.
   batch_error(const std::string& library, const std::string& function);
   ~batch_error() override;
 };

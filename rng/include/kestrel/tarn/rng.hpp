@@ -3,6 +3,7 @@
 #pragma once
 
 #include <kestrel/tarn/exceptions.hpp>
+#include <kestrel/tarn/rng/bit_generator.hpp>
 #include <kestrel/tarn/rng/distributions.hpp>
 #include <kestrel/tarn/rng/engines.hpp>
 #include <kestrel/tarn/rng/functions.hpp>

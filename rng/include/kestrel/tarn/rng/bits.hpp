@@ -9,13 +9,15 @@
 
 namespace kestrel::tarn::rng {
 
-/// Raw words of the engine, of the engine's own width (Philox: 32 bits, mcg31m1: 31 bits).
+/// Raw words of the engine, of the engine's own width (Philox: 32 bits, mcg31m1: 31 bits). A word
+/// of mcg59 has 59 bits and takes two values, low part first.
 template <typename UIntType = std::uint32_t>
 class TARN_EXPORT bits {
   static_assert(detail::is_one_of<UIntType, std::uint32_t>,
                 "bits: the result type is std::uint32_t");
 
  public:
+  /// The argument of the template.
   using result_type = UIntType;
 };
 
@@ -28,6 +30,7 @@ class TARN_EXPORT uniform_bits {
                 "uniform_bits: the result type is std::uint32_t or std::uint64_t");
 
  public:
+  /// The argument of the template.
   using result_type = UIntType;
 };
 

@@ -1,20 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
 // Continuous distributions: parameters only. Drawing is in generate.hpp; every class keeps the
-// values given at construction and refuses those outside their ranges with invalid_argument.
+// values given at construction. The manual has a page for each: density, words consumed, method,
+// accuracy.
 #pragma once
 
-#include <cstdint>
 #include <limits>
-#include <vector>
 
 #include <kestrel/tarn/export.hpp>
 #include <kestrel/tarn/rng/detail/type_list.hpp>
+#include <kestrel/tarn/rng/gamma_family.hpp>
 
 namespace kestrel::tarn::rng {
 
+/// How uniform draws: one word for one result.
 namespace uniform_method {
-struct TARN_EXPORT standard {};  // rounding may deliver the upper bound
-struct TARN_EXPORT accurate {};  // reals clamped to [a, b]; integers drawn in double precision
+/// Rounding may deliver the upper bound.
+struct TARN_EXPORT standard {};
+/// Reals are clamped to [a, b]; integers are drawn in double precision.
+struct TARN_EXPORT accurate {};
 }  // namespace uniform_method
 
 namespace detail {
@@ -34,23 +37,37 @@ class TARN_EXPORT uniform {
                 "uniform: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = Type;
   using method_type = Method;
+  ///@}
 
+  /// \param a  least value
+  /// \param b  upper bound, above a; b - a and a + b must be finite
+  ///
+  /// Raises nothing: a CPU queue reports other bounds and draws nothing.
   explicit uniform(Type a = Type(0), Type b = detail::default_upper_bound<Type>);
 
+  ///@{
+  /// As given to the constructor.
   Type a() const { return a_; }
   Type b() const { return b_; }
+  ///@}
 
  private:
   Type a_;
   Type b_;
 };
 
+/// How gaussian draws. Box and Muller, Annals of Mathematical Statistics 29, 1958.
 namespace gaussian_method {
-struct TARN_EXPORT box_muller {};   // two words, one result
-struct TARN_EXPORT box_muller2 {};  // two words, two results
-struct TARN_EXPORT icdf {};         // one word, one result
+/// Two words, one result.
+struct TARN_EXPORT box_muller {};
+/// Two words, two results.
+struct TARN_EXPORT box_muller2 {};
+/// Inversion: one word, one result.
+struct TARN_EXPORT icdf {};
 }  // namespace gaussian_method
 
 /// Normal with mean `mean` and standard deviation `stddev`.
@@ -62,23 +79,39 @@ class TARN_EXPORT gaussian {
                 "gaussian: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = RealType;
   using method_type = Method;
+  ///@}
 
+  /// \param mean    finite
+  /// \param stddev  standard deviation, finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit gaussian(RealType mean = RealType(0), RealType stddev = RealType(1));
 
+  ///@{
+  /// As given to the constructor.
   RealType mean() const { return mean_; }
   RealType stddev() const { return stddev_; }
+  ///@}
 
  private:
   RealType mean_;
   RealType stddev_;
 };
 
+/// How lognormal draws: as gaussian, then the exponential. An accurate method keeps results from
+/// rounding below displ.
 namespace lognormal_method {
+/// Two words, two results.
 struct TARN_EXPORT box_muller2 {};
+/// The same, results never below displ.
 struct TARN_EXPORT box_muller2_accurate {};
+/// Inversion: one word, one result.
 struct TARN_EXPORT icdf {};
+/// The same, results never below displ.
 struct TARN_EXPORT icdf_accurate {};
 }  // namespace lognormal_method
 
@@ -92,16 +125,28 @@ class TARN_EXPORT lognormal {
                 "lognormal: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = RealType;
   using method_type = Method;
+  ///@}
 
+  /// \param m      mean of the normal, finite
+  /// \param s      its standard deviation, finite and above 0
+  /// \param displ  displacement, finite
+  /// \param scale  finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit lognormal(RealType m = RealType(0), RealType s = RealType(1),
                      RealType displ = RealType(0), RealType scale = RealType(1));
 
+  ///@{
+  /// As given to the constructor.
   RealType m() const { return m_; }
   RealType s() const { return s_; }
   RealType displ() const { return displ_; }
   RealType scale() const { return scale_; }
+  ///@}
 
  private:
   RealType m_;
@@ -110,9 +155,12 @@ class TARN_EXPORT lognormal {
   RealType scale_;
 };
 
+/// How exponential draws: one word, one result.
 namespace exponential_method {
+/// Inversion.
 struct TARN_EXPORT icdf {};
-struct TARN_EXPORT icdf_accurate {};  // results never below a
+/// Inversion; results never below a.
+struct TARN_EXPORT icdf_accurate {};
 }  // namespace exponential_method
 
 /// Exponential with displacement `a` and scale `beta` > 0: mean a + beta.
@@ -125,106 +173,35 @@ class TARN_EXPORT exponential {
       "exponential: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = RealType;
   using method_type = Method;
+  ///@}
 
+  /// \param a     displacement, finite: the least value
+  /// \param beta  scale, finite and above 0
+  ///
+  /// Raises invalid_argument for beta <= 0.
   explicit exponential(RealType a = RealType(0), RealType beta = RealType(1));
 
+  ///@{
+  /// As given to the constructor.
   RealType a() const { return a_; }
   RealType beta() const { return beta_; }
+  ///@}
 
  private:
   RealType a_;
   RealType beta_;
 };
 
-namespace gamma_method {
-struct TARN_EXPORT marsaglia {};
-struct TARN_EXPORT marsaglia_accurate {};  // results never below a
-}  // namespace gamma_method
-
-/// Gamma with shape `alpha` > 0, displacement `a` and scale `beta` > 0.
-template <typename RealType = float, typename Method = gamma_method::marsaglia>
-class TARN_EXPORT gamma {
-  static_assert(detail::is_real_result<RealType>, "gamma: the result type is float or double");
-  static_assert(
-      detail::is_one_of<Method, gamma_method::marsaglia, gamma_method::marsaglia_accurate>,
-      "gamma: no such method");
-
- public:
-  using result_type = RealType;
-  using method_type = Method;
-
-  explicit gamma(RealType alpha = RealType(1), RealType a = RealType(0),
-                 RealType beta = RealType(1));
-
-  RealType alpha() const { return alpha_; }
-  RealType a() const { return a_; }
-  RealType beta() const { return beta_; }
-
- private:
-  RealType alpha_;
-  RealType a_;
-  RealType beta_;
-};
-
-namespace beta_method {
-struct TARN_EXPORT cja {};
-struct TARN_EXPORT cja_accurate {};  // results inside [a, a + b]
-}  // namespace beta_method
-
-/// Beta with shapes `p` and `q`, displacement `a` and scale `b`: support [a, a + b].
-template <typename RealType = float, typename Method = beta_method::cja>
-class TARN_EXPORT beta {
-  static_assert(detail::is_real_result<RealType>, "beta: the result type is float or double");
-  static_assert(detail::is_one_of<Method, beta_method::cja, beta_method::cja_accurate>,
-                "beta: no such method");
-
- public:
-  using result_type = RealType;
-  using method_type = Method;
-
-  explicit beta(RealType p = RealType(1), RealType q = RealType(1), RealType a = RealType(0),
-                RealType b = RealType(1));
-
-  RealType p() const { return p_; }
-  RealType q() const { return q_; }
-  RealType a() const { return a_; }
-  RealType b() const { return b_; }
-
- private:
-  RealType p_;
-  RealType q_;
-  RealType a_;
-  RealType b_;
-};
-
-namespace chi_square_method {
-struct TARN_EXPORT gamma_based {};
-}  // namespace chi_square_method
-
-/// Chi-square with `n` >= 1 degrees of freedom.
-template <typename RealType = float, typename Method = chi_square_method::gamma_based>
-class TARN_EXPORT chi_square {
-  static_assert(detail::is_real_result<RealType>, "chi_square: the result type is float or double");
-  static_assert(detail::is_one_of<Method, chi_square_method::gamma_based>,
-                "chi_square: no such method");
-
- public:
-  using result_type = RealType;
-  using method_type = Method;
-
-  explicit chi_square(std::int32_t n = 1);
-
-  std::int32_t n() const { return n_; }
-
- private:
-  std::int32_t n_;
-};
-
+/// How weibull draws: one word, one result.
 namespace weibull_method {
+/// Inversion.
 struct TARN_EXPORT icdf {};
-struct TARN_EXPORT icdf_accurate {};  // results never below a
+/// Inversion; results never below a.
+struct TARN_EXPORT icdf_accurate {};
 }  // namespace weibull_method
 
 /// Weibull with `alpha`, displacement `a` and scale `beta`.
@@ -235,15 +212,26 @@ class TARN_EXPORT weibull {
                 "weibull: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = RealType;
   using method_type = Method;
+  ///@}
 
+  /// \param alpha  shape, finite and above 0
+  /// \param a      displacement, finite: the least value
+  /// \param beta   scale, finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit weibull(RealType alpha = RealType(1), RealType a = RealType(0),
                    RealType beta = RealType(1));
 
+  ///@{
+  /// As given to the constructor.
   RealType alpha() const { return alpha_; }
   RealType a() const { return a_; }
   RealType beta() const { return beta_; }
+  ///@}
 
  private:
   RealType alpha_;
@@ -256,13 +244,18 @@ namespace detail {
 template <typename RealType, typename Method>
 class TARN_EXPORT location_scale {
  public:
+  /// The argument of the template.
   using result_type = RealType;
+  /// The argument of the template.
   using method_type = Method;
 
+  /// As given to the constructor.
   RealType a() const { return a_; }
+  /// As given to the constructor.
   RealType b() const { return b_; }
 
  protected:
+  /// Takes any numbers.
   location_scale(RealType a, RealType b) : a_(a), b_(b) {}
 
  private:
@@ -271,9 +264,12 @@ class TARN_EXPORT location_scale {
 };
 }  // namespace detail
 
+/// How rayleigh draws: one word, one result.
 namespace rayleigh_method {
+/// Inversion.
 struct TARN_EXPORT icdf {};
-struct TARN_EXPORT icdf_accurate {};  // results never below a
+/// Inversion; results never below a.
+struct TARN_EXPORT icdf_accurate {};
 }  // namespace rayleigh_method
 
 /// Rayleigh with displacement `a` and scale `b`.
@@ -284,10 +280,16 @@ class TARN_EXPORT rayleigh : public detail::location_scale<RealType, Method> {
                 "rayleigh: no such method");
 
  public:
+  /// \param a  displacement, finite: the least value
+  /// \param b  scale, finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit rayleigh(RealType a = RealType(0), RealType b = RealType(1));
 };
 
+/// How gumbel draws.
 namespace gumbel_method {
+/// Inversion: one word, one result.
 struct TARN_EXPORT icdf {};
 }  // namespace gumbel_method
 
@@ -298,10 +300,16 @@ class TARN_EXPORT gumbel : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_one_of<Method, gumbel_method::icdf>, "gumbel: no such method");
 
  public:
+  /// \param a  location, finite: the mode
+  /// \param b  scale, finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit gumbel(RealType a = RealType(0), RealType b = RealType(1));
 };
 
+/// How laplace draws.
 namespace laplace_method {
+/// Inversion of distance and side: two words, one result.
 struct TARN_EXPORT icdf {};
 }  // namespace laplace_method
 
@@ -312,10 +320,16 @@ class TARN_EXPORT laplace : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_one_of<Method, laplace_method::icdf>, "laplace: no such method");
 
  public:
+  /// \param a  mean, finite
+  /// \param b  scale, finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit laplace(RealType a = RealType(0), RealType b = RealType(1));
 };
 
+/// How cauchy draws.
 namespace cauchy_method {
+/// Inversion: one word, one result.
 struct TARN_EXPORT icdf {};
 }  // namespace cauchy_method
 
@@ -326,6 +340,10 @@ class TARN_EXPORT cauchy : public detail::location_scale<RealType, Method> {
   static_assert(detail::is_one_of<Method, cauchy_method::icdf>, "cauchy: no such method");
 
  public:
+  /// \param a  median, finite
+  /// \param b  scale, finite and above 0
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit cauchy(RealType a = RealType(0), RealType b = RealType(1));
 };
 

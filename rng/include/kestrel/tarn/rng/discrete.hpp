@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Discrete distributions: parameters only. Drawing is in generate.hpp; every class keeps the values
-// given at construction and refuses those outside their ranges with invalid_argument.
+// given at construction. The manual has a page for each: probabilities, words consumed, method,
+// accuracy. Results above the greatest std::int32_t are that integer.
 #pragma once
 
 #include <cstdint>
@@ -11,9 +12,13 @@
 
 namespace kestrel::tarn::rng {
 
+/// How poisson draws. Schmeiser and Kachitvichyanukul, Purdue Memorandum 81-4, 1981; Temme, SIAM J.
+/// Math. Anal. 10, 1979.
 namespace poisson_method {
-struct TARN_EXPORT ptpe {};                 // transformed rejection; CPU queues only
-struct TARN_EXPORT gaussian_icdf_based {};  // one word, one result; an approximation
+/// Rejection, exact; CPU queues only.
+struct TARN_EXPORT ptpe {};
+/// One word, one result; an approximation.
+struct TARN_EXPORT gaussian_icdf_based {};
 }  // namespace poisson_method
 
 /// Poisson of rate `lambda` > 0.
@@ -26,18 +31,29 @@ class TARN_EXPORT poisson {
       "poisson: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param lambda  rate, finite and above 0
+  ///
+  /// Raises invalid_argument for lambda <= 0.
   explicit poisson(double lambda = 1.0);
 
+  ///@{
+  /// As given to the constructor.
   double lambda() const { return lambda_; }
+  ///@}
 
  private:
   double lambda_;
 };
 
+/// How poisson_v draws.
 namespace poisson_v_method {
+/// One word, one result; an approximation.
 struct TARN_EXPORT gaussian_icdf_based {};
 }  // namespace poisson_v_method
 
@@ -51,19 +67,30 @@ class TARN_EXPORT poisson_v {
                 "poisson_v: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param lambda  rates, each finite and above 0; as many as results are drawn
+  ///
+  /// Raises invalid_argument for an empty list.
   explicit poisson_v(const std::vector<double>& lambda);
 
+  ///@{
+  /// As given to the constructor.
   const std::vector<double>& lambda() const { return lambda_; }
+  ///@}
 
  private:
   std::vector<double> lambda_;
 };
 
+/// How binomial draws. Kachitvichyanukul and Schmeiser, Comm. ACM 31, 1988.
 namespace binomial_method {
-struct TARN_EXPORT btpe {};  // Kachitvichyanukul and Schmeiser 1988
+/// Rejection; a table for small counts.
+struct TARN_EXPORT btpe {};
 }  // namespace binomial_method
 
 /// Successes in `ntrial` trials of probability `p`.
@@ -74,20 +101,32 @@ class TARN_EXPORT binomial {
   static_assert(detail::is_one_of<Method, binomial_method::btpe>, "binomial: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param ntrial  trials, 1 or more
+  /// \param p       probability of a success, in [0, 1]
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit binomial(std::int32_t ntrial = 5, double p = 0.5);
 
+  ///@{
+  /// As given to the constructor.
   std::int32_t ntrial() const { return ntrial_; }
   double p() const { return p_; }
+  ///@}
 
  private:
   std::int32_t ntrial_;
   double p_;
 };
 
+/// How negative_binomial draws.
 namespace negative_binomial_method {
+/// Rejection; a table for small counts.
 struct TARN_EXPORT nbar {};
 }  // namespace negative_binomial_method
 
@@ -100,21 +139,33 @@ class TARN_EXPORT negative_binomial {
                 "negative_binomial: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param a  number of the last success, real, finite and above 0
+  /// \param p  probability of a success, in (0, 1]
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit negative_binomial(double a = 1.0, double p = 0.5);
 
+  ///@{
+  /// As given to the constructor.
   double a() const { return a_; }
   double p() const { return p_; }
+  ///@}
 
  private:
   double a_;
   double p_;
 };
 
+/// How hypergeometric draws. Kachitvichyanukul and Schmeiser, J. Stat. Comput. Simul. 22, 1985.
 namespace hypergeometric_method {
-struct TARN_EXPORT h2pe {};  // Kachitvichyanukul and Schmeiser 1985
+/// Rejection; a table for small counts.
+struct TARN_EXPORT h2pe {};
 }  // namespace hypergeometric_method
 
 /// Marked items in a sample of `s` from a lot of `l` items of which `m` are marked.
@@ -126,14 +177,25 @@ class TARN_EXPORT hypergeometric {
                 "hypergeometric: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param l  items in the lot
+  /// \param s  items in the sample, 0 to l
+  /// \param m  marked items in the lot, 0 to l
+  ///
+  /// Raises invalid_argument for s < 0, m < 0, l < s and l < m.
   explicit hypergeometric(std::int32_t l = 2, std::int32_t s = 1, std::int32_t m = 1);
 
+  ///@{
+  /// As given to the constructor.
   std::int32_t l() const { return l_; }
   std::int32_t s() const { return s_; }
   std::int32_t m() const { return m_; }
+  ///@}
 
  private:
   std::int32_t l_;
@@ -141,7 +203,10 @@ class TARN_EXPORT hypergeometric {
   std::int32_t m_;
 };
 
+/// How multinomial draws: trial by trial from a table (Chen and Asau, AIIE Transactions 6, 1974) or
+/// by conditional binomials (Davis, Comput. Stat. Data Anal. 16, 1993).
 namespace multinomial_method {
+/// The words that a row takes vary.
 struct TARN_EXPORT poisson_icdf_based {};
 }  // namespace multinomial_method
 
@@ -155,20 +220,32 @@ class TARN_EXPORT multinomial {
                 "multinomial: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param ntrial  trials in a row, 0 or more
+  /// \param p       probabilities of the categories, at least one, none negative, with sum 1
+  ///
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
   explicit multinomial(std::int32_t ntrial, const std::vector<double>& p);
 
+  ///@{
+  /// As given to the constructor.
   std::int32_t ntrial() const { return ntrial_; }
   const std::vector<double>& p() const { return p_; }
+  ///@}
 
  private:
   std::int32_t ntrial_;
   std::vector<double> p_;
 };
 
+/// How geometric draws.
 namespace geometric_method {
+/// Inversion: one word, one result.
 struct TARN_EXPORT icdf {};
 }  // namespace geometric_method
 
@@ -180,18 +257,29 @@ class TARN_EXPORT geometric {
   static_assert(detail::is_one_of<Method, geometric_method::icdf>, "geometric: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param p  probability of a success, in (0, 1)
+  ///
+  /// Raises invalid_argument for p <= 0 and p >= 1.
   explicit geometric(double p = 0.5);
 
+  ///@{
+  /// As given to the constructor.
   double p() const { return p_; }
+  ///@}
 
  private:
   double p_;
 };
 
+/// How bernoulli draws.
 namespace bernoulli_method {
+/// Inversion: one word, one result.
 struct TARN_EXPORT icdf {};
 }  // namespace bernoulli_method
 
@@ -203,12 +291,21 @@ class TARN_EXPORT bernoulli {
   static_assert(detail::is_one_of<Method, bernoulli_method::icdf>, "bernoulli: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = IntType;
   using method_type = Method;
+  ///@}
 
+  /// \param p  probability of 1, in [0, 1]
+  ///
+  /// Raises invalid_argument for p < 0 and p > 1.
   explicit bernoulli(double p = 0.5);
 
+  ///@{
+  /// As given to the constructor.
   double p() const { return p_; }
+  ///@}
 
  private:
   double p_;

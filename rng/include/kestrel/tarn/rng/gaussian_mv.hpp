@@ -17,14 +17,18 @@ enum class TARN_EXPORT matrix_layout : std::uint8_t {
   diagonal = 2,  ///< dimension entries: only the diagonal
 };
 
+/// How gaussian_mv draws its normals: as the methods of gaussian.
 namespace gaussian_mv_method {
+/// Two words for one coordinate.
 struct TARN_EXPORT box_muller {};
+/// Two words for two coordinates.
 struct TARN_EXPORT box_muller2 {};
+/// One word for one coordinate.
 struct TARN_EXPORT icdf {};
 }  // namespace gaussian_mv_method
 
 /// mean + T z with z a vector of `dimension` independent standard normals: one result is a vector
-/// of `dimension` values. The sizes of `mean` and `matrix` must match `dimension` and the layout.
+/// of `dimension` values.
 template <typename RealType = float, matrix_layout Layout = matrix_layout::full,
           typename Method = gaussian_mv_method::box_muller2>
 class TARN_EXPORT gaussian_mv {
@@ -35,15 +39,26 @@ class TARN_EXPORT gaussian_mv {
                 "gaussian_mv: no such method");
 
  public:
+  ///@{
+  /// The argument of the template.
   using result_type = RealType;
   using method_type = Method;
+  ///@}
 
+  /// \param dimension  coordinates of a vector, 1 or more
+  /// \param mean       as many means
+  /// \param matrix     T in the layout, of the length told there
+  ///
+  /// Raises invalid_argument for a list of another length.
   explicit gaussian_mv(std::uint32_t dimension, const std::vector<RealType>& mean,
                        const std::vector<RealType>& matrix);
 
+  ///@{
+  /// As given to the constructor.
   std::uint32_t dimension() const { return dimension_; }
   const std::vector<RealType>& mean() const { return mean_; }
   const std::vector<RealType>& matrix() const { return matrix_; }
+  ///@}
 
  private:
   std::uint32_t dimension_;

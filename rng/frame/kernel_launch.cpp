@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The one submission of engines without device state.
-#include "frame/device_road.hpp"
+// The one submission of engines whose state travels by value.
+#include "frame/kernel_launch.hpp"
 
 #include <cstring>
 

@@ -1,0 +1,99 @@
+// SPDX-License-Identifier: Apache-2.0
+// The virtual GPU against a plain loop over the same stepping header, compiled with the same flags:
+// what the frame of kernels, launches and work-items costs. Its rate should be at least 0.8 of the
+// loop's, times the number of threads.
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <kestrel/tarn/rng.hpp>
+#include <sycl/sycl.hpp>
+
+#include <benchmark/benchmark.h>
+
+#include "../statistics/ratios.hpp"
+#include "engines/mcg31m1.hpp"
+#include "engines/mcg59.hpp"
+#include "engines/philox4x32x10.hpp"
+#include "frame/engine_func.hpp"
+
+namespace {
+
+namespace rng = kestrel::tarn::rng;
+namespace detail = kestrel::tarn::rng::detail;
+
+constexpr std::int64_t count = 1 << 24;
+constexpr double least_share = 0.8;
+
+std::vector<float>& values() {
+  static std::vector<float> memory(count, 1.0f);
+  return memory;
+}
+
+/// One work-item after the other, on one thread.
+template <typename Engine>
+void plain_loop(benchmark::State& state) {
+  using traits = detail::engine_traits<Engine>;
+  typename traits::record start{};
+  std::memset(&start, 1, sizeof start);
+  if constexpr (std::is_same_v<Engine, rng::philox4x32x10>) {
+    start.idx = 0;
+  }
+  const auto rule = traits::rule(detail::gpu::real_range<float>{0.0f, 1.0f});
+  float* out = values().data();
+  benchmark::DoNotOptimize(start);  // what a kernel gets is not known when it is compiled either
+  for (auto _ : state) {
+    for (std::uint64_t g = 0; g < count / 4; ++g) {
+      typename traits::record position = start;
+      sycl::vec<float, 4> block;
+      traits::template four<detail::gpu::drawn::reals>(&position, g, block, rule);
+      detail::store_values(out, 4 * g, count, block);
+    }
+    benchmark::ClobberMemory();
+  }
+  state.SetItemsProcessed(state.iterations() * count);
+}
+
+template <typename Engine>
+void virtual_gpu(benchmark::State& state) {
+  sycl::queue queue(sycl::gpu_selector_v);
+  Engine engine(queue);
+  for (auto _ : state) {
+    rng::generate(rng::uniform<float>(), engine, count, values().data()).wait();
+    benchmark::ClobberMemory();
+  }
+  state.SetItemsProcessed(state.iterations() * count);
+}
+
+template <typename Engine>
+void register_engine(const std::string& name) {
+  for (const auto& [what, run] :
+       {std::pair{"/loop", plain_loop<Engine>}, std::pair{"/virtual_gpu", virtual_gpu<Engine>}}) {
+    benchmark::RegisterBenchmark((name + what).c_str(), run)->UseRealTime()->Repetitions(5);
+  }
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  setenv("LUMEN_VIRTUAL_DEVICES", "gpu", 0);
+  const std::vector<std::string> engines = {"philox4x32x10", "mcg31m1", "mcg59"};
+  register_engine<rng::philox4x32x10>(engines[0]);
+  register_engine<rng::mcg31m1>(engines[1]);
+  register_engine<rng::mcg59>(engines[2]);
+  if (!initialize(argc, argv)) {
+    return 1;
+  }
+  ratio_reporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  const double threads = std::thread::hardware_concurrency();
+  std::printf("\nuniform<float>, %lld values, %.0f threads\n", static_cast<long long>(count),
+              threads);
+  for (const std::string& engine : engines) {
+    reporter.print_ratio(engine + "/virtual_gpu", engine + "/loop", least_share * threads);
+  }
+}

@@ -1,0 +1,261 @@
+// SPDX-License-Identifier: Apache-2.0
+// The kernels of Mersenne twisters. The recurrence has no cheap jump, so teams of work-items walk
+// it: a work-group copies the image of a state into local memory, makes words there in rounds of
+// one word for each work-item, with a barrier between rounds, and stores the image that the next
+// call begins with. How the groups share a call and the states is the engine's affair:
+// engine_traits has
+//   shape    the twister_shape
+//   groups   a plain record that travels to the kernel, with
+//     source(group)                the image that the group starts from
+//     target(group, count)         where it stores the image it ends with; null where it is dropped
+//     constants(group)
+//     share(group, count, plan)    its part of the call
+//     moves(group, count, plan)    whether the stored image stands behind the words it has made
+// The image is copied by the work-items themselves: asynchronous copies are not there, or not
+// right, in every implementation of SYCL.
+#pragma once
+
+#include <cstdint>
+#include <type_traits>
+
+#include <sycl/sycl.hpp>
+
+#include "engines/twister.hpp"
+#include "frame/engine_func.hpp"
+
+namespace kestrel::tarn::rng::detail {
+
+/// A group's part of a call.
+struct twister_share {
+  std::uint64_t replayed;  // rounds of its state that it passes over
+  std::uint64_t first;     // rounds of the call before its own
+  std::uint64_t rounds;    // its own
+};
+
+/// One work-item of a team on the ring in local memory.
+template <typename Shape>
+class twister_walker {
+ public:
+  SYCL_EXTERNAL twister_walker(const sycl::nd_item<1>& item, std::uint32_t* image,
+                               std::uint32_t matrix)
+      : item_(item),
+        image_(image),
+        matrix_(matrix),
+        l_(static_cast<std::uint32_t>(item.get_local_id(0))) {}
+
+  /// The number of the work-item in its team.
+  SYCL_EXTERNAL std::uint32_t number() const { return l_; }
+
+  SYCL_EXTERNAL void meet() const { sycl::group_barrier(item_.get_group()); }
+
+  SYCL_EXTERNAL void load(const std::uint32_t* source) {
+    copy(source, image_);
+    meet();
+    j_ = Shape::wrap(image_[Shape::ring] + l_);
+  }
+  SYCL_EXTERNAL void store(std::uint32_t* target) const {
+    meet();
+    copy(image_, target);
+  }
+
+  /// Makes a word and returns the one that leaves the state for it, not tempered.
+  SYCL_EXTERNAL std::uint32_t retire() const {
+    const std::uint32_t oldest = image_[j_];
+    image_[Shape::wrap(j_ + Shape::order)] = twisted<Shape>(
+        oldest, image_[Shape::wrap(j_ + 1)], image_[Shape::wrap(j_ + Shape::middle)], matrix_);
+    return oldest;
+  }
+  /// That word again, which no other work-item writes before the team is two rounds on.
+  SYCL_EXTERNAL std::uint32_t retired() const { return image_[j_]; }
+
+  /// To the work-item's place in the next round.
+  SYCL_EXTERNAL void advance() { j_ = Shape::wrap(j_ + Shape::team); }
+
+  /// Passes over rounds.
+  SYCL_EXTERNAL void replay(std::uint64_t rounds) {
+    for (; rounds != 0; --rounds) {
+      retire();
+      meet();
+      advance();
+    }
+  }
+
+  /// After the rounds, and a tail of `tail` words: the position of the next word to be delivered,
+  /// stored by the work-item that made the last one. It is 1 to Shape::ring: a position at the
+  /// ring's end means the same as one at its start.
+  SYCL_EXTERNAL void move_position(std::uint32_t tail) const {
+    // Without a tail the last work-item stands one round behind its last word.
+    const std::uint32_t last = tail == 0 ? Shape::team : tail;
+    if (l_ + 1 == last) {
+      const std::uint32_t made = tail == 0 ? j_ + Shape::order : j_;
+      image_[Shape::ring] = Shape::wrap(made) + 1;
+    }
+  }
+
+ private:
+  SYCL_EXTERNAL void copy(const std::uint32_t* from, std::uint32_t* to) const {
+    for (std::uint32_t i = l_; i < Shape::image; i += Shape::team) {
+      to[i] = from[i];
+    }
+  }
+
+  sycl::nd_item<1> item_;
+  std::uint32_t* image_;
+  std::uint32_t matrix_;
+  std::uint32_t l_;
+  std::uint32_t j_ = 0;  // place of the oldest word that is this work-item's
+};
+
+/// One result of one value. Functors of closed formulas have that as such; others make four, of
+/// which one is taken.
+template <typename Functor, typename = void>
+inline constexpr bool has_one = false;
+template <typename Functor>
+inline constexpr bool has_one<Functor, std::void_t<decltype(&Functor::one)>> = true;
+
+template <typename T, typename R, typename Functor>
+SYCL_EXTERNAL T twister_result(const Functor& functor, R value) {
+  if constexpr (has_one<Functor>) {
+    return functor.one(value);
+  } else {
+    return functor(sycl::vec<R, 4>(value))[0];
+  }
+}
+
+/// Functors that make half their results of the first two values, and half of the last two: those
+/// with a function for a pair, and 64-bit results of two words.
+template <typename Functor>
+inline constexpr bool takes_pairs = gpu::has_pair<Functor> || Functor::results == 2;
+template <typename Functor>
+inline constexpr int results_of_pair = Functor::results / 2;
+
+template <typename T, typename R, typename Functor>
+SYCL_EXTERNAL void twister_results(const Functor& functor, R first, R second, T* out) {
+  if constexpr (gpu::has_pair<Functor>) {
+    functor.pair(first, second, out);
+  } else {
+    const sycl::vec<T, Functor::results> values =
+        functor(sycl::vec<R, 4>(first, second, first, second));
+    for (int i = 0; i < results_of_pair<Functor>; ++i) {
+      out[i] = values[i];
+    }
+  }
+}
+
+/// In pair mode the values of a round, one a work-item, until half of the team takes two of them
+/// each.
+template <typename R, bool pairs>
+struct twister_slots {};
+template <typename R>
+struct twister_slots<R, true> {
+  sycl::local_accessor<R, 1> values;
+};
+
+template <typename Engine, typename T, typename R, typename Functor, typename Out, bool pairs,
+          bool mid_block>
+struct engine_func_mt {
+  using shape = typename engine_traits<Engine>::shape;
+  using walker_type = twister_walker<shape>;
+
+  Out r;
+  sycl::local_accessor<std::uint32_t, 1> image;
+  twister_slots<R, pairs> slots;
+  Functor functor;
+  typename engine_traits<Engine>::groups groups;
+  twister_plan plan;
+  word_rule<R> rule;
+  std::uint64_t n;
+
+  SYCL_EXTERNAL void operator()(sycl::nd_item<1> item) const {
+    const auto group = static_cast<std::uint32_t>(item.get_group(0));
+    const auto count = static_cast<std::uint32_t>(item.get_group_range(0));
+    const twister_constants constants = groups.constants(group);
+    const twister_share share = groups.share(group, count, plan);
+    const std::uint32_t tail = group + 1 == count ? plan.tail : 0;
+    std::uint32_t* const target = groups.target(group, count);
+    if (share.rounds == 0 && target == nullptr) {
+      return;  // the whole group
+    }
+
+    walker_type walker(item, &image[0], constants.matrix);
+    walker.load(groups.source(group));
+    walker.replay(share.replayed);
+    if constexpr (pairs) {
+      write_pairs(walker, constants, share, tail);
+    } else {
+      write(walker, constants, share, tail);
+    }
+    if (groups.moves(group, count, plan)) {
+      walker.move_position(tail);
+    }
+    if (target != nullptr) {
+      walker.store(target);
+    }
+  }
+
+ private:
+  SYCL_EXTERNAL R value_of(std::uint32_t word, const twister_constants& constants) const {
+    return unsigned_word(temper<shape>(word, constants), rule);
+  }
+
+  /// The work-item's value of a round. Both forms give the same word.
+  SYCL_EXTERNAL R next_value(const walker_type& walker, const twister_constants& constants) const {
+    const std::uint32_t word = walker.retire();
+    walker.meet();
+    return value_of(mid_block ? walker.retired() : word, constants);
+  }
+
+  SYCL_EXTERNAL void write(walker_type& walker, const twister_constants& constants,
+                           const twister_share& share, std::uint32_t tail) const {
+    std::uint64_t index = share.first * shape::team + walker.number();
+    for (std::uint64_t round = 0; round < share.rounds; ++round) {
+      r[index] = twister_result<T>(functor, next_value(walker, constants));
+      walker.advance();
+      index += shape::team;
+    }
+    if (walker.number() < tail) {
+      r[index] = twister_result<T>(functor, value_of(walker.retire(), constants));
+    }
+  }
+
+  SYCL_EXTERNAL void write_pairs(walker_type& walker, const twister_constants& constants,
+                                 const twister_share& share, std::uint32_t tail) const {
+    const std::uint32_t number = walker.number();
+    std::uint64_t pair = share.first * (shape::team / 2) + number;
+    for (std::uint64_t round = 0; round < share.rounds; ++round) {
+      slots.values[number] = next_value(walker, constants);
+      walker.meet();
+      if (number < shape::team / 2) {
+        store_pair(pair, number);
+      }
+      pair += shape::team / 2;
+      walker.advance();
+    }
+    if (tail == 0) {
+      return;
+    }
+    // The slots of the last round have to be read before they are written again. Of an odd tail the
+    // last pair takes a word that the position does not move past: the next call makes it again.
+    walker.meet();
+    if (number < tail + tail % 2) {
+      slots.values[number] = value_of(walker.retire(), constants);
+    }
+    walker.meet();
+    if (number < (tail + 1) / 2) {
+      store_pair(pair, number);
+    }
+  }
+
+  /// The results of pair `pair` of the call, which stands in slots 2 * number and 2 * number + 1;
+  /// those past the end are dropped.
+  SYCL_EXTERNAL void store_pair(std::uint64_t pair, std::uint32_t number) const {
+    constexpr std::uint64_t results = results_of_pair<Functor>;
+    T out[results];
+    twister_results<T, R>(functor, slots.values[2 * number], slots.values[2 * number + 1], out);
+    for (std::uint64_t i = 0; i < results && pair * results + i < n; ++i) {
+      r[pair * results + i] = out[i];
+    }
+  }
+};
+
+}  // namespace kestrel::tarn::rng::detail

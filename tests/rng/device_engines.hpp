@@ -1,0 +1,54 @@
+// SPDX-License-Identifier: Apache-2.0
+// The engines whose rows say that their device road is there, as types for suites, and the GPUs
+// that suites over them walk.
+#pragma once
+
+#include <string>
+#include <tuple>
+#include <vector>
+
+#include <kestrel/tarn/rng.hpp>
+#include <sycl/sycl.hpp>
+
+#include <gtest/gtest.h>
+
+#include "frame/rows.hpp"
+#include "queues.hpp"
+
+namespace tarn_test {
+
+/// Types<...> of the engines for which `row::device_road` holds.
+template <typename Kept, typename... Rest>
+struct with_device_road {
+  using type = Kept;
+};
+template <typename... Kept, typename First, typename... Rest>
+struct with_device_road<testing::Types<Kept...>, First, Rest...> {
+  using type = typename with_device_road<
+      std::conditional_t<kestrel::tarn::rng::detail::engine_row<First>::device_road,
+                         testing::Types<Kept..., First>, testing::Types<Kept...>>,
+      Rest...>::type;
+};
+
+/// The twisters have suites of their own: a skip costs them as much as drawing, or does not exist.
+/// So has sobol: its seed is a count of dimensions, and its sequence has an end.
+using device_engines = with_device_road<testing::Types<>, kestrel::tarn::rng::philox4x32x10,
+                                        kestrel::tarn::rng::mrg32k3a, kestrel::tarn::rng::mcg31m1,
+                                        kestrel::tarn::rng::mcg59>::type;
+
+struct engine_name {
+  template <typename Engine>
+  static std::string GetName(int) {
+    return kestrel::tarn::rng::detail::engine_row<Engine>::name;
+  }
+};
+
+inline std::vector<sycl::queue> gpu_queues() {
+  std::vector<sycl::queue> queues;
+  for (const sycl::device& device : sycl::device::get_devices(sycl::info::device_type::gpu)) {
+    queues.emplace_back(device);
+  }
+  return queues;
+}
+
+}  // namespace tarn_test
