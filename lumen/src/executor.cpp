@@ -197,7 +197,10 @@ void executor::work() {
       unlink(next);
       run_claimed(next, lock);
       eager = true;
-    } else if (!sentinel_ && (first_ready_ != nullptr || idle_naps < naps_until_deep_sleep)) {
+    } else if (!sentinel_ &&
+               (first_ready_ != nullptr || (idle_naps < naps_until_deep_sleep && loops_.empty()))) {
+      // While a loop runs, naps would take its processors from it, and whoever ends it looks
+      // around.
       sentinel_ = true;
       nap(lock);
       sentinel_ = false;

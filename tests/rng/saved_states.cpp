@@ -200,7 +200,7 @@ TEST(saved_members, of_a_set_stay_that_member) {
   EXPECT_EQ(next(loaded, 9), next(engine, 9));
 }
 
-/// What the helper program drew after saving to, or loading from, a file.
+/// What the child program drew after saving to, or loading from, a file.
 std::string drawn_by_child(const char* action, const char* engine, bool on_gpu,
                            const std::string& file) {
   const auto child =
