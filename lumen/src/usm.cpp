@@ -87,7 +87,12 @@ void* aligned_alloc(std::size_t alignment, std::size_t bytes, const device& dev,
   void* pointer =
       record.driver->allocate(record, kind, std::max(alignment, least_alignment), bytes);
   if (pointer != nullptr) {
-    allocation_table::instance().add(pointer, {bytes, kind, &record, owner});
+    try {
+      allocation_table::instance().add(pointer, {bytes, kind, &record, owner});
+    } catch (...) {
+      record.driver->release(record, kind, pointer);
+      throw;
+    }
   }
   return pointer;
 }
