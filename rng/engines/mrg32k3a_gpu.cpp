@@ -162,8 +162,7 @@ void skip_ahead(sycl::queue&, impl* moved, std::initializer_list<std::uint64_t> 
     throw computation_error("rng", "skip_ahead",
                             "mrg32k3a engine with sub-sequence parallelization");
   }
-  skip_stream(moved->stream.get(), static_cast<std::int64_t>(num_to_skip.size()),
-              num_to_skip.begin());
+  skip_stream(moved->stream.get(), num_to_skip);
 }
 
 template impl* create_engine<engine>(sycl::queue&, std::uint64_t);

@@ -145,7 +145,11 @@ impl* create_engine(sycl::queue& queue, impl* other) {
 
 template <>
 void skip_ahead(sycl::queue& queue, impl* moved, std::uint64_t num_to_skip) {
-  static_cast<backend*>(moved)->skip(queue, num_to_skip);
+  if (backend* const resident = on_gpu(moved)) {
+    resident->skip(queue, num_to_skip);
+  } else {
+    skip_stream(moved->stream.get(), num_to_skip);
+  }
 }
 
 template impl* create_engine<engine>(sycl::queue&, std::uint64_t);

@@ -127,8 +127,7 @@ void skip_ahead(sycl::queue&, engine_base_impl<Engine>* engine, std::uint64_t nu
 template <typename Engine>
 void skip_ahead(sycl::queue&, engine_base_impl<Engine>* engine,
                 std::initializer_list<std::uint64_t> num_to_skip) {
-  skip_stream(engine->stream.get(), static_cast<std::int64_t>(num_to_skip.size()),
-              num_to_skip.begin());
+  skip_stream(engine->stream.get(), num_to_skip);
 }
 
 template <typename Engine>

@@ -2,9 +2,6 @@
 // Skipping an engine: on its stream, or by the GPU level, which knows of state on the device.
 #pragma once
 
-#include <cstdint>
-#include <initializer_list>
-
 #include <kestrel/tarn/rng/device_level.hpp>
 #include <sycl/sycl.hpp>
 
@@ -12,13 +9,6 @@
 #include "frame/rows.hpp"
 
 namespace kestrel::tarn::rng::detail {
-
-inline void skip_by(rvx_stream stream, std::uint64_t count) {
-  skip_stream(stream, count);
-}
-inline void skip_by(rvx_stream stream, std::initializer_list<std::uint64_t> digits) {
-  skip_stream(stream, static_cast<std::int64_t>(digits.size()), digits.begin());
-}
 
 /// `Count` is a number, or a list of 64-bit digits.
 template <typename Engine, typename Count>
@@ -29,7 +19,7 @@ void skip_engine(sycl::queue& queue, engine_base_impl<Engine>* impl, Count count
       return;
     }
   }
-  skip_by(impl->stream.get(), count);
+  skip_stream(impl->stream.get(), count);
 }
 
 }  // namespace kestrel::tarn::rng::detail

@@ -55,8 +55,10 @@ void skip_stream(rvx_stream stream, std::uint64_t words) {
   require_moved(rvxSkipAheadStream(stream, static_cast<std::int64_t>(words)), "skip_ahead");
 }
 
-void skip_stream(rvx_stream stream, std::int64_t digits, const std::uint64_t* words) {
-  require_moved(rvxSkipAheadStreamEx(stream, digits, words), "skip_ahead");
+void skip_stream(rvx_stream stream, std::initializer_list<std::uint64_t> digits) {
+  require_moved(
+      rvxSkipAheadStreamEx(stream, static_cast<std::int64_t>(digits.size()), digits.begin()),
+      "skip_ahead");
 }
 
 void leapfrog_stream(rvx_stream stream, std::uint64_t idx, std::uint64_t stride) {

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <initializer_list>
 #include <memory>
 #include <tarn_rvx.h>
 
@@ -26,7 +27,7 @@ std::int64_t member_code(std::int64_t code, std::uint32_t engine_idx, std::uint3
 /// Move a stream by `words`, or by the number whose 64-bit digits are given, least significant
 /// first; raise computation_error ("skip_ahead").
 void skip_stream(rvx_stream stream, std::uint64_t words);
-void skip_stream(rvx_stream stream, std::int64_t digits, const std::uint64_t* words);
+void skip_stream(rvx_stream stream, std::initializer_list<std::uint64_t> digits);
 
 /// Leaves a stream every `stride`-th word from word `idx` on; raises computation_error
 /// ("leapfrog").
