@@ -66,8 +66,10 @@ void register_rows(const sycl::device& device) {
 #define TARN_REGISTER(...)                                                         \
   register_call<philox4x32x10, __VA_ARGS__>("philox4x32x10", #__VA_ARGS__, device, \
                                             {1, 1000, 4000000});
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
-  TARN_IF_##built(TARN_REGISTER type)
+#define TARN_REGISTER_generate(type) TARN_REGISTER type
+#define TARN_REGISTER_generate_ex(type)  // bench_compound
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
+  TARN_IF_##gpu(TARN_REGISTER_##road(type))
 #include "distributions/distributions.def"
 }
 
@@ -75,8 +77,8 @@ void register_engines(const sycl::device& device) {
 #define TARN_REGISTER_ENGINE(name) \
   register_call<rng::name, rng::uniform<>>(#name, "uniform<>", device, {4000000, 1 << 24});
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
-  TARN_IF_##built(TARN_REGISTER_ENGINE(name))
+                    uniform_bits)                                                            \
+  TARN_IF_##gpu(TARN_REGISTER_ENGINE(name))
 #include "engines/engines.def"
 }
 

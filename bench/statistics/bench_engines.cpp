@@ -30,7 +30,7 @@ struct engine_row {
 
 const engine_row engines[] = {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   {#name, code, (word_bits + 31) / 32, skip != 0},
 #include "rng/engines/engines.def"
 };

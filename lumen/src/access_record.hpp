@@ -24,6 +24,8 @@ class access_record {
   void remove_holder(const task& holder);
   // What a host access has to wait for.
   std::vector<task_ref> conflicts(bool writes) const;
+  // A user that has not ended, other than one that runs on this thread; null if there is none.
+  task_ref unfinished() const;
 
  private:
   struct holder {

@@ -60,6 +60,17 @@ std::vector<task_ref> access_record::conflicts(bool writes) const {
   return result;
 }
 
+task_ref access_record::unfinished() const {
+  const auto runs_elsewhere = [](const task_ref& user) {
+    return !user->done() && !user->runs_on_this_thread();
+  };
+  if (last_writer_ && runs_elsewhere(last_writer_)) {
+    return last_writer_;
+  }
+  const auto reader = std::find_if(readers_.begin(), readers_.end(), runs_elsewhere);
+  return reader == readers_.end() ? task_ref() : *reader;
+}
+
 buffer_core::buffer_core(std::size_t bytes)
     : bytes_(bytes), record_(std::make_unique<access_record>()) {}
 buffer_core::~buffer_core() = default;
@@ -106,10 +117,13 @@ class host_hold {
   host_hold(std::shared_ptr<buffer_core> core, bool writes)
       : core_(std::move(core)), task_(new task(nullptr, command_group{})) {
     std::vector<task_ref> before;
-    {
+    try {
       const std::lock_guard<std::mutex> lock(access_record::order_mutex());
       before = core_->record().conflicts(writes);
       core_->record().add_holder(*task_, writes);
+    } catch (...) {
+      end();
+      throw;
     }
     wait_for_others(before);
   }
@@ -121,11 +135,15 @@ class host_hold {
       const std::lock_guard<std::mutex> lock(access_record::order_mutex());
       core_->record().remove_holder(*task_);
     }
+    end();
+  }
+
+ private:
+  void end() {
     task_->finish_linking();
     task_->wait();
   }
 
- private:
   std::shared_ptr<buffer_core> core_;
   task* task_;  // keeps itself alive until it is done
 };
@@ -135,8 +153,8 @@ buffer_handle::buffer_handle(std::shared_ptr<buffer_core> shared_core)
     : core(std::move(shared_core)) {}
 
 buffer_handle::~buffer_handle() {
-  std::vector<task_ref> users = conflicts_of(*core, true);
   if (const task* closing = task::closing_on_this_thread()) {
+    std::vector<task_ref> users = conflicts_of(*core, true);
     users.erase(
         std::remove_if(users.begin(), users.end(),
                        [=](const task_ref& user) { return user.get() == closing || user->done(); }),
@@ -146,7 +164,14 @@ buffer_handle::~buffer_handle() {
       return;
     }
   }
-  wait_for_others(users);
+  // One after the other, without memory: a buffer may go because there is none.
+  const auto unfinished = [this] {
+    const std::lock_guard<std::mutex> lock(access_record::order_mutex());
+    return core->record().unfinished();
+  };
+  while (const task_ref user = unfinished()) {
+    user->wait();
+  }
   core->write_back();
 }
 

@@ -7,6 +7,7 @@
 #include <chrono>
 #include <cstdlib>
 #include <ctime>
+#include <new>
 #include <system_error>
 #include <unistd.h>
 
@@ -46,13 +47,15 @@ executor::executor() : thread_count_(number_of_threads()) {
 
 void executor::start_threads() {
   process_ = getpid();
-  threads_.reserve(thread_count_);
-  for (unsigned i = 0; i < thread_count_; ++i) {
-    try {
+  try {
+    threads_.reserve(thread_count_);
+    for (unsigned i = 0; i < thread_count_; ++i) {
       threads_.emplace_back([this] { work(); });
-    } catch (const std::system_error&) {
-      return;  // at a limit of the system: fewer workers are slower, not wrong
     }
+  } catch (const std::system_error&) {
+    // at a limit of the system: fewer workers are slower, not wrong
+  } catch (const std::bad_alloc&) {
+    // the same
   }
 }
 

@@ -3,6 +3,7 @@
 #include "task.hpp"
 
 #include <chrono>
+#include <new>
 
 #include "backend.hpp"
 #include "clock.hpp"
@@ -144,30 +145,54 @@ void task::sleep_while(std::uint32_t word) noexcept {
   }
 }
 
+namespace {
+void keep_if_possible(std::vector<task_ref>& path, task_ref passed) noexcept {
+  if (passed) {
+    try {
+      path.push_back(std::move(passed));
+    } catch (const std::bad_alloc&) {
+    }
+  }
+}
+
+task_ref take_last(std::vector<task_ref>& path) noexcept {
+  if (path.empty()) {
+    return {};
+  }
+  task_ref last = std::move(path.back());
+  path.pop_back();
+  return last;
+}
+}  // namespace
+
 void task::wait() {
   executor& threads = executor::instance();
-  // Each task of the path holds up the one before it, the first this one. Whoever sleeps does it
-  // on the last: when that is done there may be nobody else to run what becomes ready.
+  // Each task of the path holds up the one before it, the first this one, and `last` is behind them
+  // all. Whoever sleeps does it on the last: when that is done there may be nobody else to run what
+  // becomes ready. The path only saves the way back: where there is no memory for it, the way
+  // begins anew, as destructors wait and must not fail.
   std::vector<task_ref> path;
+  task_ref last;  // null: this one
   for (int spins = 0;;) {
-    task& last = path.empty() ? *this : *path.back().get();
-    const std::uint32_t word = last.word_.load(std::memory_order_acquire);
+    task& now = last ? *last.get() : *this;
+    const std::uint32_t word = now.word_.load(std::memory_order_acquire);
     const auto its = static_cast<task_state>(word & state_mask);
     if (its == task_state::done) {
-      if (path.empty()) {
+      if (!last) {
         return;
       }
-      path.pop_back();
+      last = take_last(path);
     } else if (its == task_state::ready) {
-      if (threads.claim(last)) {
-        last.run();
+      if (threads.claim(now)) {
+        now.run();
       }
-    } else if (task_ref next = its == task_state::pending ? last.open_dependency() : task_ref()) {
-      path.push_back(std::move(next));
+    } else if (task_ref next = its == task_state::pending ? now.open_dependency() : task_ref()) {
+      keep_if_possible(path, std::move(last));
+      last = std::move(next);
     } else if (++spins < spins_before_sleep) {
       relax();
     } else {
-      last.sleep_while(word);
+      now.sleep_while(word);
     }
   }
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Every family: its routines on the host, and its functors where its device road is built.
+// Every family: its routines on the host, and the functors of those that draw with one kernel.
 #pragma once
 
 #include "distributions/gamma.hpp"

@@ -38,7 +38,7 @@ struct gaussian_box_muller {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return pairs_of(*this, u);
+    return pairs_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL void pair(R u0, R u1, R* out) const {
@@ -62,7 +62,7 @@ struct gaussian_box_muller2 {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return pairs_of(*this, u);
+    return pairs_of<R>(*this, u);
   }
 
   /// The sine's normal first.
@@ -90,7 +90,7 @@ struct lognormal_box_muller2 {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return pairs_of(*this, u);
+    return pairs_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL void pair(R u0, R u1, R* out) const {

@@ -28,7 +28,7 @@ struct exponential_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL R one(R u) const {
@@ -55,7 +55,7 @@ struct weibull_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL R one(R u) const {
@@ -80,7 +80,7 @@ struct rayleigh_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL R one(R u) const {
@@ -103,7 +103,7 @@ struct gumbel_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   /// The second logarithm is guarded as well: -ln(u) is 0 where rounding brings u to 1.
@@ -124,7 +124,7 @@ struct cauchy_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL R one(R u) const { return sycl::mad(b, sycl::tan(u), a); }
@@ -146,7 +146,7 @@ struct laplace_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return pairs_of(*this, u);
+    return pairs_of<R>(*this, u);
   }
 
   /// The half and what is below lie on the right; a u1 that is no number goes to the left.

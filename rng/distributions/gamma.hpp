@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// gamma, chi_square and beta.
+// gamma, chi_square and beta on the host. Their device roads are the modules <family>_gpu_dispatch.
 #pragma once
 
 #include <kestrel/tarn/rng/continuous.hpp>

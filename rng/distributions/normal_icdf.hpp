@@ -28,7 +28,7 @@ struct gaussian_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL R one(R u) const {
@@ -53,7 +53,7 @@ struct lognormal_icdf {
   real_range<R> range() const { return {lo, hi}; }
 
   SYCL_EXTERNAL sycl::vec<R, results> operator()(const sycl::vec<R, 4>& u) const {
-    return each_of(*this, u);
+    return each_of<R>(*this, u);
   }
 
   SYCL_EXTERNAL R one(R u) const {

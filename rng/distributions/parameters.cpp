@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // Constructors of all distribution classes, with the checks of their parameters. The conditions
 // and the words of the messages are part of the contract, the odd ones included: callers compare
-// them as text.
+// them as text. Where results are drawn by rejection, what could never be accepted is refused here,
+// as a device would go on drawing for ever: hence the conditions that a NaN fails.
 #include <algorithm>
+#include <cmath>
 #include <cstddef>
 #include <limits>
 #include <string>
@@ -54,13 +56,17 @@ exponential<RealType, Method>::exponential(RealType a, RealType beta) : a_(a), b
 template <typename RealType, typename Method>
 gamma<RealType, Method>::gamma(RealType alpha, RealType a, RealType beta)
     : alpha_(alpha), a_(a), beta_(beta) {
-  refuse_if(alpha <= RealType(0), "gamma", "alpha <= 0");
+  refuse_if(!(alpha > RealType(0)), "gamma", "alpha <= 0");
   refuse_if(beta <= RealType(0), "gamma", "beta <= 0");
 }
 
 template <typename RealType, typename Method>
 beta<RealType, Method>::beta(RealType p, RealType q, RealType a, RealType b)
-    : p_(p), q_(q), a_(a), b_(b) {}
+    : p_(p), q_(q), a_(a), b_(b) {
+  refuse_if(p <= RealType(0), "beta", "p <= 0");
+  refuse_if(q <= RealType(0), "beta", "q <= 0");
+  refuse_if(std::isinf(p) || std::isinf(q), "beta", "p or q is infinite");
+}
 
 template <typename RealType, typename Method>
 chi_square<RealType, Method>::chi_square(std::int32_t n) : n_(n) {
@@ -108,10 +114,17 @@ poisson_v<IntType, Method>::poisson_v(const std::vector<double>& lambda) : lambd
 }
 
 template <typename IntType, typename Method>
-binomial<IntType, Method>::binomial(std::int32_t ntrial, double p) : ntrial_(ntrial), p_(p) {}
+binomial<IntType, Method>::binomial(std::int32_t ntrial, double p) : ntrial_(ntrial), p_(p) {
+  refuse_if(ntrial < 0, "binomial", "ntrial < 0");
+  refuse_if(!(p >= 0.0 && p <= 1.0), "binomial", "p > 1 or p < 0");
+}
 
 template <typename IntType, typename Method>
-negative_binomial<IntType, Method>::negative_binomial(double a, double p) : a_(a), p_(p) {}
+negative_binomial<IntType, Method>::negative_binomial(double a, double p) : a_(a), p_(p) {
+  refuse_if(!(a > 0.0), "negative_binomial", "a <= 0");
+  refuse_if(std::isinf(a), "negative_binomial", "a is infinite");
+  refuse_if(!(p > 0.0 && p <= 1.0), "negative_binomial", "p > 1 or p <= 0");
+}
 
 template <typename IntType, typename Method>
 hypergeometric<IntType, Method>::hypergeometric(std::int32_t l, std::int32_t s, std::int32_t m)
@@ -135,9 +148,8 @@ bernoulli<IntType, Method>::bernoulli(double p) : p_(p) {
   refuse_if(p > 1.0 || p < 0.0, "bernoulli", "p > 1 or p < 0");
 }
 
-// Every row, built or not: parameters are there before the drawing is. `bits` and `uniform_bits`
-// have no constructors and their instantiation emits nothing.
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
+// `bits` and `uniform_bits` have no constructors and their instantiation emits nothing.
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
   template class TARN_UNWRAP type;
 #include "distributions/distributions.def"
 

@@ -2,6 +2,7 @@
 // mcg59 on GPU queues: the exported level and, through it, the kernels.
 #include "distributions/all.hpp"
 #include "engines/mcg59.hpp"
+#include "frame/compound_road.hpp"
 #include "frame/device_road.hpp"
 
 namespace kestrel::tarn::rng::detail::gpu {
@@ -16,8 +17,8 @@ template void delete_engine<engine>(sycl::queue&, impl*);
 template void skip_ahead<engine>(sycl::queue&, impl*, std::uint64_t);
 template void leapfrog<engine>(sycl::queue&, impl*, std::uint64_t, std::uint64_t);
 
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
-  TARN_IF_##built(TARN_DEVICE_ROAD_OF(engine, result, TARN_UNWRAP type))
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
+  TARN_IF_##gpu(TARN_DEVICE_ROAD_##road(engine, result, TARN_UNWRAP type))
 #include "distributions/distributions.def"
 
 }  // namespace kestrel::tarn::rng::detail::gpu

@@ -143,7 +143,7 @@ sycl::event engine_base_impl_backend<mrg32k3a, device_type::gpu>::generate(
       queue.get_device().get_info<sycl::info::device::max_work_group_size>();
   const call_type call{{n, r, distribution.kernel}, group_size};
   return submit_with_snapshot(
-      queue, dependencies, stream.get(), words_taken<Distribution>(n),
+      queue, dependencies, stream.get(), words_taken<functor>(n),
       {&call_type::launch, &call, sizeof(tag_rvx_sycl_brng_mrg32k3a_stream_t)});
 }
 

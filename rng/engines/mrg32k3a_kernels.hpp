@@ -48,7 +48,8 @@ struct engine_func<mrg32k3a, T, R, Functor, Out> {
       for (int i = 0; i < 4; ++i) {
         words[i] = unsigned_word(mrg32k3a_step(&position), rule);
       }
-      store_values<T, Functor::results>(r, block * values, n, functor(words));
+      const std::uint64_t base = block * values;
+      store_values<T, Functor::results>(r, base, n, results_of<T>(functor, words, base));
     }
   }
 };

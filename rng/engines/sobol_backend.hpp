@@ -63,8 +63,10 @@ class engine_base_impl_backend<sobol, device_type::gpu> : public engine_base_imp
   void store();
   void load(const sycl::queue& queue);
 
- private:
+  /// Whether the stream has the marker.
   bool runs_on_devices() const;
+
+ private:
   void check_period(std::uint64_t words) const;
   /// Submits a kernel that makes `n` words from where the engine stands, which it leaves there.
   /// `kernel.launch` gets a sobol_walk for a record.
@@ -76,6 +78,10 @@ class engine_base_impl_backend<sobol, device_type::gpu> : public engine_base_imp
   std::unique_ptr<sobol_image> image_;
   sycl::event last_event_;  // of the kernels that use the image
 };
+
+inline bool is_silent(const engine_base_impl_backend<sobol, device_type::gpu>& backend) {
+  return !backend.runs_on_devices();
+}
 
 /// A call on its way to engine_func.
 template <typename T, typename Functor, typename Out>
@@ -118,14 +124,15 @@ sycl::event engine_base_impl_backend<sobol, device_type::gpu>::generate(
   if (!runs_on_devices()) {
     return {};
   }
-  const std::uint64_t taken = words_taken<Distribution>(n);
+  const std::uint64_t taken = words_taken<functor>(n);
   check_period(taken);
   const std::size_t group_size =
       queue.get_device().get_info<sycl::info::device::max_work_group_size>();
-  if constexpr (gpu::has_pair<functor>) {
+  if constexpr (gpu::values_together < functor >> 1) {
     // Where an odd count leaves the last pair without its second word, the word behind takes part
     // and stays in the sequence; at the end it is 0. The host does the same.
-    const std::uint64_t drawn = (taken + 1) / 2 * 2;
+    constexpr std::uint64_t together = gpu::values_together<functor>;
+    const std::uint64_t drawn = (taken + together - 1) / together * together;
     using raw = gpu::bits_std<std::uint32_t>;
     using words_call = sobol_call<std::uint32_t, raw, std::uint32_t*>;
     using pairs_call = sobol_pairs_call<T, functor, Out>;
@@ -138,8 +145,13 @@ sycl::event engine_base_impl_backend<sobol, device_type::gpu>::generate(
   } else {
     using call_type = sobol_call<T, functor, Out>;
     const call_type call{r, distribution.kernel, group_size};
-    const sycl::event event = submit(queue, dependencies, taken, {&call_type::launch, &call, 0});
-    move(queue, taken);
+    sycl::event event = submit(queue, dependencies, taken, {&call_type::launch, &call, 0});
+    try {
+      move(queue, taken);
+    } catch (...) {
+      event.wait();  // the caller may take from the kernel what it reads
+      throw;
+    }
     return event;
   }
 }

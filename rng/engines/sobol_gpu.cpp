@@ -7,6 +7,7 @@
 
 #include "distributions/all.hpp"
 #include "engines/sobol_backend.hpp"
+#include "frame/compound_road.hpp"
 #include "frame/device_road.hpp"
 #include "frame/state.hpp"
 
@@ -157,8 +158,8 @@ template impl* create_engine<engine>(sycl::queue&, std::int64_t, const std::uint
 template impl* create_engine<engine>(sycl::queue&, void*);
 template void delete_engine<engine>(sycl::queue&, impl*);
 
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
-  TARN_IF_##built(TARN_DEVICE_ROAD_OF(engine, result, TARN_UNWRAP type))
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
+  TARN_IF_##gpu(TARN_DEVICE_ROAD_##road(engine, result, TARN_UNWRAP type))
 #include "distributions/distributions.def"
 
 }  // namespace gpu

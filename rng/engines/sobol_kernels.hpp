@@ -71,7 +71,8 @@ struct engine_func<sobol, T, R, Functor, Out> {
         word ^= directions[sobol_step(index)];
         ++index;
       }
-      const sycl::vec<T, 4> values = functor(words);
+      const sycl::vec<T, 4> values =
+          results_of<T>(functor, words, static_cast<std::uint64_t>(place), walk.dimensions);
       for (int i = 0; i < 4; ++i) {
         if (place >= 0 && place < end) {
           r[static_cast<std::size_t>(place)] = values[i];

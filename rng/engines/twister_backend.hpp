@@ -48,7 +48,7 @@ struct twister_call {
 
   template <bool mid_block>
   static void launch(sycl::handler& group, const void* context, const void*) {
-    constexpr bool pairs = takes_pairs<Functor>;
+    constexpr bool pairs = gpu::values_together < Functor >> 1;
     const auto& call = *static_cast<const twister_call*>(context);
     auto out = bind_output(group, call.r);
     const engine_func_mt<Engine, T, source, Functor, decltype(out), pairs, mid_block> kernel{
@@ -92,12 +92,9 @@ class twister_backend : public engine_base_impl<Engine> {
                        const std::vector<sycl::event>& dependencies) {
     using functor = typename Distribution::functor;
     using call_type = twister_call<Engine, T, functor, Out>;
-    const call_type call{static_cast<std::uint64_t>(n),
-                         words_taken<Distribution>(n),
-                         r,
-                         distribution.kernel,
-                         image.groups(),
-                         image.group_count()};
+    const call_type call{
+        static_cast<std::uint64_t>(n), words_taken<functor>(n), r,
+        distribution.kernel,           image.groups(),          image.group_count()};
     const auto launch =
         image.mid_block() ? &call_type::template launch<true> : &call_type::template launch<false>;
     last_event = submit_in_order(queue, dependencies, last_event, {launch, &call, 0});

@@ -106,44 +106,8 @@ class twister_walker {
   std::uint32_t j_ = 0;  // place of the oldest word that is this work-item's
 };
 
-/// One result of one value. Functors of closed formulas have that as such; others make four, of
-/// which one is taken.
-template <typename Functor, typename = void>
-inline constexpr bool has_one = false;
-template <typename Functor>
-inline constexpr bool has_one<Functor, std::void_t<decltype(&Functor::one)>> = true;
-
-template <typename T, typename R, typename Functor>
-SYCL_EXTERNAL T twister_result(const Functor& functor, R value) {
-  if constexpr (has_one<Functor>) {
-    return functor.one(value);
-  } else {
-    return functor(sycl::vec<R, 4>(value))[0];
-  }
-}
-
-/// Functors that make half their results of the first two values, and half of the last two: those
-/// with a function for a pair, and 64-bit results of two words.
-template <typename Functor>
-inline constexpr bool takes_pairs = gpu::has_pair<Functor> || Functor::results == 2;
-template <typename Functor>
-inline constexpr int results_of_pair = Functor::results / 2;
-
-template <typename T, typename R, typename Functor>
-SYCL_EXTERNAL void twister_results(const Functor& functor, R first, R second, T* out) {
-  if constexpr (gpu::has_pair<Functor>) {
-    functor.pair(first, second, out);
-  } else {
-    const sycl::vec<T, Functor::results> values =
-        functor(sycl::vec<R, 4>(first, second, first, second));
-    for (int i = 0; i < results_of_pair<Functor>; ++i) {
-      out[i] = values[i];
-    }
-  }
-}
-
-/// In pair mode the values of a round, one a work-item, until half of the team takes two of them
-/// each.
+/// In pair mode the values of a round, one a work-item, until some of the team take two or four of
+/// them each.
 template <typename R, bool pairs>
 struct twister_slots {};
 template <typename R>
@@ -209,26 +173,26 @@ struct engine_func_mt {
                            const twister_share& share, std::uint32_t tail) const {
     std::uint64_t index = share.first * shape::team + walker.number();
     for (std::uint64_t round = 0; round < share.rounds; ++round) {
-      r[index] = twister_result<T>(functor, next_value(walker, constants));
+      store_one(index, next_value(walker, constants));
       walker.advance();
       index += shape::team;
     }
     if (walker.number() < tail) {
-      r[index] = twister_result<T>(functor, value_of(walker.retire(), constants));
+      store_one(index, value_of(walker.retire(), constants));
     }
   }
 
   SYCL_EXTERNAL void write_pairs(walker_type& walker, const twister_constants& constants,
                                  const twister_share& share, std::uint32_t tail) const {
     const std::uint32_t number = walker.number();
-    std::uint64_t pair = share.first * (shape::team / 2) + number;
+    std::uint64_t pair = share.first * takers + number;
     for (std::uint64_t round = 0; round < share.rounds; ++round) {
       slots.values[number] = next_value(walker, constants);
       walker.meet();
-      if (number < shape::team / 2) {
+      if (number < takers) {
         store_pair(pair, number);
       }
-      pair += shape::team / 2;
+      pair += takers;
       walker.advance();
     }
     if (tail == 0) {
@@ -236,26 +200,41 @@ struct engine_func_mt {
     }
     // The slots of the last round have to be read before they are written again. Of an odd tail the
     // last pair takes a word that the position does not move past: the next call makes it again.
+    const std::uint32_t taking = (tail + together - 1) / together;
     walker.meet();
-    if (number < tail + tail % 2) {
+    if (number < taking * together) {
       slots.values[number] = value_of(walker.retire(), constants);
     }
     walker.meet();
-    if (number < (tail + 1) / 2) {
+    if (number < taking) {
       store_pair(pair, number);
     }
   }
 
-  /// The results of pair `pair` of the call, which stands in slots 2 * number and 2 * number + 1;
-  /// those past the end are dropped.
+  SYCL_EXTERNAL void store_one(std::uint64_t index, R value) const {
+    T out[1];
+    results_of_some<T>(functor, &value, index, out);
+    r[index] = out[0];
+  }
+
+  /// The results of pair (or four) number `pair` of the call, which stands in the slots from
+  /// together * number on; those past the end are dropped.
   SYCL_EXTERNAL void store_pair(std::uint64_t pair, std::uint32_t number) const {
-    constexpr std::uint64_t results = results_of_pair<Functor>;
+    constexpr std::uint64_t results = gpu::results_together<Functor>;
+    R values[together];
+    for (std::uint32_t i = 0; i < together; ++i) {
+      values[i] = slots.values[together * number + i];
+    }
     T out[results];
-    twister_results<T, R>(functor, slots.values[2 * number], slots.values[2 * number + 1], out);
+    results_of_some<T>(functor, values, pair * results, out);
     for (std::uint64_t i = 0; i < results && pair * results + i < n; ++i) {
       r[pair * results + i] = out[i];
     }
   }
+
+  static constexpr std::uint32_t together = gpu::values_together<Functor>;
+  static constexpr std::uint32_t takers = shape::team / together;
+  static_assert(shape::team % together == 0);
 };
 
 }  // namespace kestrel::tarn::rng::detail

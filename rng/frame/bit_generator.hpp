@@ -45,7 +45,7 @@ inline constexpr bool has_end = false;
 
 enum class seed_kind : std::uint8_t { u32, u64, dim, none };
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   template <>                                                                                \
   inline constexpr bool has_end<name> = seed_kind::seed_type == seed_kind::dim;
 #include "engines/engines.def"

@@ -46,12 +46,10 @@ void refuse_device(const sycl::queue& queue) {
   throw unsupported_device("rng", "generate", queue.get_device());
 }
 
-void refuse_device_road(const char* name, const char* kind) {
-  throw unimplemented("rng", "generate", std::string(name) + " " + kind + " on a GPU");
-}
-
-void refuse_ptpe() {
-  throw unimplemented("rng", "generate", "poisson distribution with ptpe method on a GPU device");
+void refuse_on_gpu(const char* family, const char* method) {
+  throw unimplemented(
+      "rng", "generate",
+      std::string(family) + " distribution with " + method + " method on a GPU device");
 }
 
 }  // namespace kestrel::tarn::rng::detail

@@ -63,8 +63,8 @@ void check_count(const poisson_v<T, Method>& distr, std::int64_t n) {
 device_type road_of(const sycl::queue& queue);
 [[noreturn]] void refuse_device(const sycl::queue& queue);
 
-/// For what is meant for GPUs and has no device road yet.
-[[noreturn]] void refuse_device_road(const char* name, const char* kind);
+/// For a method that is drawn on CPU queues alone.
+[[noreturn]] void refuse_on_gpu(const char* family, const char* method);
 
 /// The families that an engine split into sub-sequences draws.
 template <typename Distr>
@@ -79,14 +79,6 @@ template <typename Engine>
 void check_mode(engine_base_impl<Engine>*, bool /*runs_in_sub_sequences*/) {}
 template <>
 void check_mode(engine_base_impl<mrg32k3a>* engine, bool runs_in_sub_sequences);
-
-/// Rejection by PTPE has no device form: on a GPU poisson is drawn by its other method alone.
-template <typename Distr>
-inline constexpr bool is_host_method = false;
-template <typename IntType>
-inline constexpr bool is_host_method<poisson<IntType, poisson_method::ptpe>> = true;
-
-[[noreturn]] void refuse_ptpe();
 
 template <typename Distr>
 inline constexpr bool is_uniform_bits = false;

@@ -53,11 +53,10 @@ struct engine_func_call {
   }
 };
 
-/// Words of the sequence that `n` results take, in the host's reckoning.
-template <typename Distribution>
+/// Words of the sequence that `n` results take.
+template <typename Functor>
 std::uint64_t words_taken(std::int64_t n) {
-  using row = distribution_row<typename public_distribution<Distribution>::type>;
-  return row::per_output_words * static_cast<std::uint64_t>(n);
+  return gpu::words_per_result<Functor> * static_cast<std::uint64_t>(n);
 }
 
 template <typename Engine>
@@ -69,7 +68,7 @@ sycl::event snapshot_backend<Engine>::generate(sycl::queue& queue, std::int64_t 
   using call_type = engine_func_call<Engine, T, functor, Out>;
   constexpr int values = functor::asks == gpu::drawn::words ? engine_row<Engine>::stored_words : 1;
   const call_type call{values_of(n, values), r, distribution.kernel};
-  return submit_with_snapshot(queue, dependencies, this->stream.get(), words_taken<Distribution>(n),
+  return submit_with_snapshot(queue, dependencies, this->stream.get(), words_taken<functor>(n),
                               {&call_type::launch, &call, sizeof(typename call_type::record_type)});
 }
 
@@ -136,6 +135,18 @@ void leapfrog(sycl::queue&, engine_base_impl<Engine>* engine, std::uint64_t idx,
   leapfrog_stream(engine->stream.get(), idx, stride);
 }
 
+/// The backend of an engine on a GPU queue. An engine made on a CPU queue, whose queue was replaced
+/// by one on a GPU, has none: raises unsupported_device.
+template <typename Engine>
+engine_base_impl_backend<Engine, device_type::gpu>& backend_of(const sycl::queue& queue,
+                                                               engine_base_impl<Engine>* engine) {
+  auto* on_gpu = dynamic_cast<engine_base_impl_backend<Engine, device_type::gpu>*>(engine);
+  if (on_gpu == nullptr) {
+    throw unsupported_device("rng", "generate", queue.get_device());
+  }
+  return *on_gpu;
+}
+
 /// From a public distribution to the backend's generate.
 template <typename Engine, typename Distr, typename Out>
 sycl::event generate_plain(sycl::queue& queue, const Distr& distr, engine_base_impl<Engine>* engine,
@@ -145,14 +156,8 @@ sycl::event generate_plain(sycl::queue& queue, const Distr& distr, engine_base_i
   } else {
     using T = typename Distr::result_type;
     using distribution = distribution_impl<T, Distr, device_type::gpu>;
-    using backend = engine_base_impl_backend<Engine, device_type::gpu>;
-    // An engine made on a CPU queue, whose queue was replaced by one on a GPU, has no such backend.
-    auto* on_gpu = dynamic_cast<backend*>(engine);
-    if (on_gpu == nullptr) {
-      throw unsupported_device("rng", "generate", queue.get_device());
-    }
-    return on_gpu->template generate<T, distribution, Out>(queue, n, r, distribution(distr),
-                                                           dependencies);
+    return backend_of(queue, engine)
+        .template generate<T, distribution, Out>(queue, n, r, distribution(distr), dependencies);
   }
 }
 
@@ -178,7 +183,7 @@ sycl::event generate(sycl::queue& queue, const Distr& distr, engine_base_impl<En
 
 /// The drawing entries of `engine` at the GPU level, for one row of a family with a fixed number of
 /// words; to be used in namespace detail::gpu.
-#define TARN_DEVICE_ROAD_OF(engine, T, ...)                                                       \
+#define TARN_DEVICE_ROAD_generate(engine, T, ...)                                                 \
   template sycl::event generate<engine, __VA_ARGS__>(sycl::queue&, const __VA_ARGS__&,            \
                                                      engine_base_impl<engine>*, std::int64_t, T*, \
                                                      const std::vector<sycl::event>&);            \

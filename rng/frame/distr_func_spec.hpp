@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The kernel of distributions on pairs over words that an earlier step has generated, for engines
-// that fill device memory with raw words: each work-item makes the results of one pair.
+// The kernel of distributions on pairs, or on four values, over words that an earlier step has
+// generated, for engines that fill device memory with raw words: each work-item makes the results
+// of one pair.
 #pragma once
 
 #include <cstdint>
@@ -14,7 +15,8 @@
 namespace kestrel::tarn::rng::detail {
 
 /// T is the result type, R the real type of the functor, Out a pointer or a write accessor, Words a
-/// pointer or a read accessor to 32-bit words: two for each work-item, also for the last one.
+/// pointer or a read accessor to 32-bit words: two (four) for each work-item, also for the last
+/// one.
 template <typename T, typename R, typename Functor, typename Out,
           typename Words = const std::uint32_t*>
 struct distr_func_spec {
@@ -25,14 +27,20 @@ struct distr_func_spec {
   std::uint64_t n;
 
   SYCL_EXTERNAL void operator()(sycl::id<1> item) const {
+    constexpr int together = gpu::values_together<Functor>;
+    constexpr int made = gpu::results_together<Functor>;
     const std::uint64_t g = item[0];
-    T results[Functor::pair_results];
-    functor.pair(unsigned_word(words[2 * g], rule), unsigned_word(words[2 * g + 1], rule), results);
-    sycl::vec<T, Functor::pair_results> values;
-    for (int j = 0; j < Functor::pair_results; ++j) {
-      values[j] = results[j];
+    R values[together];
+    for (int i = 0; i < together; ++i) {
+      values[i] = unsigned_word(words[g * together + static_cast<std::uint64_t>(i)], rule);
     }
-    store_values(r, g * Functor::pair_results, n, values);
+    T out[made];
+    results_of_some<T>(functor, values, g * made, out);
+    sycl::vec<T, made> results;
+    for (int i = 0; i < made; ++i) {
+      results[i] = out[i];
+    }
+    store_values(r, g * made, n, results);
   }
 };
 
@@ -45,7 +53,7 @@ void launch_distr_func_spec(sycl::handler& group, const Words& words, std::int64
   auto out = bind_output(group, r);
   const distr_func_spec<T, R, Functor, decltype(out), Words> kernel{
       words, out, functor, unsigned_rule(functor.range()), static_cast<std::uint64_t>(n)};
-  group.parallel_for(sycl::range<1>(work_items(n, Functor::pair_results)), kernel);
+  group.parallel_for(sycl::range<1>(work_items(n, gpu::results_together<Functor>)), kernel);
 }
 
 }  // namespace kestrel::tarn::rng::detail

@@ -56,11 +56,19 @@ class snapshot_backend : public engine_base_impl<Engine> {
 template <typename T, typename Distr, device_type device>
 struct distribution_impl;
 
+/// The same where the parameters choose among algorithms: `Algorithm` is the one taken.
+template <typename T, typename Distr, device_type device, typename Algorithm>
+struct distribution_impl_ex;
+
 /// The public distribution that a distribution_impl was made from.
 template <typename Distribution>
 struct public_distribution;
 template <typename T, typename Distr, device_type device>
 struct public_distribution<distribution_impl<T, Distr, device>> {
+  using type = Distr;
+};
+template <typename T, typename Distr, device_type device, typename Algorithm>
+struct public_distribution<distribution_impl_ex<T, Distr, device, Algorithm>> {
   using type = Distr;
 };
 

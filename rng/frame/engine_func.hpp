@@ -27,6 +27,46 @@ SYCL_EXTERNAL void store_values(const Out& r, std::uint64_t base, std::uint64_t 
   }
 }
 
+/// The results of four values, the first of which stands at place `first` of the call and the
+/// others `step` apart.
+template <typename T, typename R, typename Functor>
+SYCL_EXTERNAL sycl::vec<T, Functor::results> results_of(const Functor& functor,
+                                                        const sycl::vec<R, 4>& values,
+                                                        std::uint64_t first,
+                                                        std::uint64_t step = 1) {
+  if constexpr (gpu::has_place<Functor>) {
+    sycl::vec<T, 4> results;
+    for (int i = 0; i < 4; ++i) {
+      results[i] = functor.at(values[i], first + static_cast<std::uint64_t>(i) * step);
+    }
+    return results;
+  } else {
+    return functor(values);
+  }
+}
+
+/// The results of as many values as the functor has to be given together, the first of which stands
+/// at place `first`.
+template <typename T, typename R, typename Functor>
+SYCL_EXTERNAL void results_of_some(const Functor& functor, const R* values, std::uint64_t first,
+                                   T* out) {
+  if constexpr (gpu::has_one<Functor>) {
+    out[0] = functor.one(values[0]);
+  } else if constexpr (gpu::has_pair<Functor>) {
+    functor.pair(values[0], values[1], out);
+  } else {
+    // What makes four results makes more than are asked for.
+    sycl::vec<R, 4> four;
+    for (int i = 0; i < 4; ++i) {
+      four[i] = values[i % gpu::values_together<Functor>];
+    }
+    const sycl::vec<T, Functor::results> results = results_of<T>(functor, four, first, 0);
+    for (int i = 0; i < gpu::results_together<Functor>; ++i) {
+      out[i] = results[i];
+    }
+  }
+}
+
 /// T is the result type, R the type that the engine delivers (real or word), Out a pointer or a
 /// write accessor.
 template <typename Engine, typename T, typename R, typename Functor, typename Out>
@@ -45,8 +85,8 @@ struct engine_func {
     const std::uint64_t g = item[0];
     sycl::vec<R, 4> values;
     engine_traits<Engine>::template four<Functor::asks>(&position, g, values, rule);
-    store_values<T, Functor::results>(r, g * static_cast<std::uint64_t>(vec_size), n,
-                                      functor(values));
+    const std::uint64_t base = g * static_cast<std::uint64_t>(vec_size);
+    store_values<T, Functor::results>(r, base, n, results_of<T>(functor, values, base));
   }
 };
 

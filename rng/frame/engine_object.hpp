@@ -18,8 +18,7 @@ template <typename Engine>
 using owned_impl = std::unique_ptr<engine_base_impl<Engine>>;
 
 /// The implementation for the queue's device: on a CPU around the stream that `make_stream` makes,
-/// on a GPU what `make_gpu` creates. Null on any other device and where the engine has no road;
-/// raises unimplemented where its device road is still missing.
+/// on a GPU what `make_gpu` creates. Null on any other device and where the engine has no road.
 template <typename Engine, typename MakeStream, typename MakeGpu>
 owned_impl<Engine> make_impl(sycl::queue& queue, MakeStream make_stream, MakeGpu make_gpu) {
   const sycl::device device = queue.get_device();
@@ -28,11 +27,7 @@ owned_impl<Engine> make_impl(sycl::queue& queue, MakeStream make_stream, MakeGpu
   }
   if constexpr (engine_row<Engine>::gpu) {
     if (device.is_gpu()) {
-      if constexpr (engine_row<Engine>::device_road) {
-        return owned_impl<Engine>(make_gpu());
-      } else {
-        throw unimplemented("rng", engine_row<Engine>::name, "this engine on a GPU");
-      }
+      return owned_impl<Engine>(make_gpu());
     }
   }
   return nullptr;

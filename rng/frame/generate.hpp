@@ -27,12 +27,8 @@ sycl::event generate_on_gpu(sycl::queue& queue, const Distr& distr, engine_base_
   check_mode(impl, runs_in_sub_sequences<Distr>);
   if constexpr (!engine_row<Engine>::gpu) {
     refuse_device(queue);
-  } else if constexpr (!engine_row<Engine>::device_road) {
-    refuse_device_road(engine_row<Engine>::name, "engine");
-  } else if constexpr (is_host_method<Distr>) {
-    refuse_ptpe();
-  } else if constexpr (!row::device_road) {
-    refuse_device_road(row::family, "distribution");
+  } else if constexpr (!row::gpu) {
+    refuse_on_gpu(row::family, row::method);
   } else if constexpr (row::entry == device_entry::generate_ex) {
     return gpu::generate_ex<Engine, Distr>(queue, distr, impl, n, r, dependencies).first;
   } else {

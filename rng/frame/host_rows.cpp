@@ -14,7 +14,7 @@ void run_host_routine(const void* distribution, rvx_stream stream, std::int64_t 
 
 #define TARN_HOST_ROW(...) \
   template void run_host_routine<__VA_ARGS__>(const void*, rvx_stream, std::int64_t, void*);
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) TARN_HOST_ROW type
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) TARN_HOST_ROW type
 #include "distributions/distributions.def"
 
 }  // namespace kestrel::tarn::rng::detail

@@ -42,7 +42,7 @@ inline std::size_t work_items(std::int64_t n, std::int32_t per_item) {
 }
 
 /// Values that `n` results of `per_result` each fill; the largest count for what passes it, which
-/// work_items turns into a range that is refused.
+/// work_items turns into a range that is refused where an engine's range grows with the count.
 inline std::int64_t values_of(std::int64_t n, std::int64_t per_result) {
   constexpr std::int64_t most = std::numeric_limits<std::int64_t>::max();
   return n > most / per_result ? most : n * per_result;
@@ -57,6 +57,16 @@ T* bind_output(sycl::handler&, T* r) {
 template <typename T>
 auto bind_output(sycl::handler& group, sycl::buffer<T, 1>& r) {
   return sycl::accessor<T, 1, sycl::access_mode::write>(r, group);
+}
+
+/// The same for a kernel that reads the output as well.
+template <typename T>
+T* bind_in_place(sycl::handler&, T* r) {
+  return r;
+}
+template <typename T>
+auto bind_in_place(sycl::handler& group, sycl::buffer<T, 1>& r) {
+  return sycl::accessor<T, 1, sycl::access_mode::read_write>(r, group);
 }
 
 }  // namespace kestrel::tarn::rng::detail

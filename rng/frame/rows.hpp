@@ -19,7 +19,7 @@ template <typename Engine>
 struct engine_row;
 
 #define TARN_ENGINE(name_, code_, label, word_bits_, seed_type, gpu_, skip, skip_list, leapfrog, \
-                    uniform_bits_, built)                                                        \
+                    uniform_bits_)                                                               \
   template <>                                                                                    \
   struct engine_row<name_> {                                                                     \
     static constexpr const char* name = #name_;                                                  \
@@ -27,7 +27,6 @@ struct engine_row;
     static constexpr int word_bits = word_bits_;                                                 \
     static constexpr int stored_words = (word_bits_ + 31) / 32;                                  \
     static constexpr bool gpu = gpu_;                                                            \
-    static constexpr bool device_road = built;                                                   \
     static constexpr bool uniform_bits = uniform_bits_;                                          \
   };
 #include "engines/engines.def"
@@ -37,11 +36,12 @@ enum class device_entry : std::uint8_t { generate, generate_ex };
 template <typename Distr>
 struct distribution_row;
 
-#define TARN_DISTRIBUTION(family_, result, method, type, words_, road, built) \
+#define TARN_DISTRIBUTION(family_, result, method_, type, words_, road, gpu_) \
   template <>                                                                 \
   struct distribution_row<TARN_UNWRAP type> {                                 \
     static constexpr const char* family = #family_;                           \
-    static constexpr bool device_road = built;                                \
+    static constexpr const char* method = #method_;                           \
+    static constexpr bool gpu = gpu_;                                         \
     static constexpr std::uint64_t per_output_words = words_;                 \
     static constexpr device_entry entry = device_entry::road;                 \
   };

@@ -13,7 +13,7 @@ namespace kestrel::tarn::rng::detail {
 /// `Count` is a number, or a list of 64-bit digits.
 template <typename Engine, typename Count>
 void skip_engine(sycl::queue& queue, engine_base_impl<Engine>* impl, Count count) {
-  if constexpr (engine_row<Engine>::device_road) {
+  if constexpr (engine_row<Engine>::gpu) {
     if (queue.get_device().is_gpu()) {
       gpu::skip_ahead<Engine>(queue, impl, count);
       return;

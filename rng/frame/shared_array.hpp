@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Device images of engines live in memory that host and device share.
+// Memory that host and device share: the device images of engines, and what lives for one call.
 #pragma once
 
 #include <cstddef>
@@ -43,6 +43,22 @@ class shared_array {
   sycl::context context_;
   std::size_t size_;
   T* data_;
+};
+
+/// Memory of one call. It goes when the last kernel has run: whoever drops it waits for that one,
+/// so that no kernel loses it when something is raised.
+template <typename T>
+struct call_memory {
+  /// Raises device_bad_alloc in the name of `engine`. For no elements there is room for one, as
+  /// memory of no bytes cannot be had.
+  call_memory(const sycl::queue& queue, std::size_t size, const char* engine)
+      : array(queue, size != 0 ? size : 1, engine) {}
+  call_memory(const call_memory&) = delete;
+  call_memory& operator=(const call_memory&) = delete;
+  ~call_memory() { last_kernel.wait(); }
+
+  shared_array<T> array;
+  sycl::event last_kernel;
 };
 
 }  // namespace kestrel::tarn::rng::detail

@@ -14,20 +14,8 @@
 
 namespace kestrel::tarn::rng::detail {
 
-/// The words between the two kernels. They go when the last kernel has run: whoever drops the last
-/// reference waits for it, so that no kernel loses them when something is raised.
-struct drawn_words {
-  /// Raises device_bad_alloc in the name of `engine`. For no words there is room for one, as memory
-  /// of no bytes cannot be had.
-  drawn_words(const sycl::queue& queue, std::size_t size, const char* engine)
-      : array(queue, size != 0 ? size : 1, engine) {}
-  drawn_words(const drawn_words&) = delete;
-  drawn_words& operator=(const drawn_words&) = delete;
-  ~drawn_words() { last_kernel.wait(); }
-
-  shared_array<std::uint32_t> array;
-  sycl::event last_kernel;
-};
+/// The words between the two kernels.
+using drawn_words = call_memory<std::uint32_t>;
 
 /// Submits the second kernel behind the first, `words->last_kernel`, and behind it a task of the
 /// host that lets go of the words, so that the caller need not wait. Returns the event of the

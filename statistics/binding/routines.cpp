@@ -33,7 +33,7 @@ int values_per_word(rvx_stream stream) {
   std::memcpy(&code, stream, sizeof code);
   switch (code & ~tarn::statistics::member_mask) {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   case code:                                                                                 \
     return word_bits > 32 ? 2 : 1;
 #include "rng/engines/engines.def"

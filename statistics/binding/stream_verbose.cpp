@@ -20,7 +20,7 @@ struct engine_label {
 
 constexpr engine_label labels[] = {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   {code, "RVX_BRNG_" #label},
 #include "rng/engines/engines.def"
 };

@@ -6,14 +6,14 @@
 namespace tarn::statistics {
 
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   extern const engine_ops name##_engine;
 #include "rng/engines/engines.def"
 
 namespace {
 
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   {code, word_bits, skip_list != 0, uniform_bits != 0, &name##_engine},
 constexpr engine_row rows[] = {
 #include "rng/engines/engines.def"

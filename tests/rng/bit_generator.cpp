@@ -47,7 +47,7 @@ constexpr bool is_bit_generator() {
   return true;
 }
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   static_assert(is_bit_generator<rng::bit_generator<rng::name>>());
 #include "engines/engines.def"
 
@@ -80,7 +80,7 @@ void for_every_repeating_engine(const Call& call) {
     if (on.repeats()) {
       ++engines;
       for (const named_queue& device : all_queues()) {
-        if (device.queue.get_device().is_cpu() || on.device_road) {
+        if (device.queue.get_device().is_cpu() || on.gpu) {
           SCOPED_TRACE(device.name);
           ++queues;
           call(on, device.queue);

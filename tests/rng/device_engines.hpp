@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The engines whose rows say that their device road is there, as types for suites, and the GPUs
-// that suites over them walk.
+// The engines on GPUs whose state travels by value, as types for suites, and the GPUs that suites
+// over them walk.
 #pragma once
 
 #include <string>
@@ -17,24 +17,11 @@
 
 namespace tarn_test {
 
-/// Types<...> of the engines for which `row::device_road` holds.
-template <typename Kept, typename... Rest>
-struct with_device_road {
-  using type = Kept;
-};
-template <typename... Kept, typename First, typename... Rest>
-struct with_device_road<testing::Types<Kept...>, First, Rest...> {
-  using type = typename with_device_road<
-      std::conditional_t<kestrel::tarn::rng::detail::engine_row<First>::device_road,
-                         testing::Types<Kept..., First>, testing::Types<Kept...>>,
-      Rest...>::type;
-};
-
 /// The twisters have suites of their own: a skip costs them as much as drawing, or does not exist.
 /// So has sobol: its seed is a count of dimensions, and its sequence has an end.
-using device_engines = with_device_road<testing::Types<>, kestrel::tarn::rng::philox4x32x10,
-                                        kestrel::tarn::rng::mrg32k3a, kestrel::tarn::rng::mcg31m1,
-                                        kestrel::tarn::rng::mcg59>::type;
+using device_engines =
+    testing::Types<kestrel::tarn::rng::philox4x32x10, kestrel::tarn::rng::mrg32k3a,
+                   kestrel::tarn::rng::mcg31m1, kestrel::tarn::rng::mcg59>;
 
 struct engine_name {
   template <typename Engine>

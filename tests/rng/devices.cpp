@@ -38,12 +38,8 @@ TEST(devices, that_are_neither_cpu_nor_gpu_have_no_engine) {
 TEST(devices, of_the_gpu_kind_have_the_engines_with_a_device_road) {
   const sycl::queue queue = gpu_queue();
   for_every_engine([&](const auto& on) {
-    if (on.device_road) {
+    if (on.gpu) {
       EXPECT_EQ(message_of<tarn::exception>([&] { on.make(queue); }), "[nothing raised]");
-    } else if (on.gpu) {
-      EXPECT_EQ(message_of<tarn::unimplemented>([&] { on.make(queue); }),
-                std::string("kestrel::tarn::rng::") + on.name +
-                    ": unimplemented functionality: this engine on a GPU");
     } else {
       EXPECT_EQ(message_of<tarn::unsupported_device>([&] { on.make(queue); }),
                 unsupported(on.name, queue));
@@ -97,41 +93,9 @@ TEST(devices, are_asked_again_by_generate) {
     if (!on.gpu) {
       EXPECT_EQ(refusal(gpu, tarn::unsupported_device("", "", gpu.get_device())),
                 unsupported("generate", gpu));
-    } else if (!on.device_road) {
-      EXPECT_EQ(refusal(gpu, tarn::unimplemented("", "", "")),
-                std::string("kestrel::tarn::rng::generate: unimplemented functionality: ") +
-                    on.name + " engine on a GPU");
     }
     EXPECT_EQ(value, 9u);
   });
-}
-
-template <typename Distr>
-void expect_device_road(const std::string& family, const std::string& method, bool device_road) {
-  constexpr std::int64_t n = 4;
-  rng::philox4x32x10 engine(gpu_queue());
-  std::vector<typename Distr::result_type> values(16);
-  sycl::buffer<typename Distr::result_type, 1> buffer{sycl::range<1>(16)};
-  const std::string refusal = method == "ptpe" ? " distribution with ptpe method on a GPU device"
-                                               : " distribution on a GPU";
-  const std::string expected =
-      device_road
-          ? "[nothing raised]"
-          : "kestrel::tarn::rng::generate: unimplemented functionality: " + family + refusal;
-  EXPECT_EQ(message_of<tarn::unimplemented>(
-                [&] { rng::generate(sample<Distr>::make(n), engine, n, values.data()).wait(); }),
-            expected);
-  EXPECT_EQ(message_of<tarn::unimplemented>(
-                [&] { rng::generate(sample<Distr>::make(n), engine, n, buffer); }),
-            expected);
-}
-
-TEST(devices, of_the_gpu_kind_have_the_distributions_with_a_device_road) {
-  using namespace rng;
-  using rng::gamma;  // <math.h> has one as well
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
-  expect_device_road<TARN_UNWRAP type>(#family, #method, built == 1);
-#include "distributions/distributions.def"
 }
 
 }  // namespace

@@ -183,24 +183,4 @@ TYPED_TEST(engine_objects, cross_over_to_the_device_of_the_source) {
   expect_next<TypeParam>(target, 3, 9);
 }
 
-// A device that is meant for the engine and not there yet is told so, by copies and assignments.
-TEST(device_roads, that_are_missing_are_told_to_copies) {
-  int missing = 0, built = 0;
-  for_every_engine([&](const auto& on) {
-    built += on.device_road ? 1 : 0;
-    if (on.gpu && !on.device_road) {
-      ++missing;
-      auto source = on.make();
-      source.get_queue() = gpu_queue();
-      auto target = on.make();
-      const std::string text = std::string("kestrel::tarn::rng::") + on.name +
-                               ": unimplemented functionality: this engine on a GPU";
-      EXPECT_EQ(message_of<tarn::unimplemented>([&] { auto copy = source; }), text);
-      EXPECT_EQ(message_of<tarn::unimplemented>([&] { target = source; }), text);
-      EXPECT_TRUE(target.get_queue().get_device().is_cpu());
-    }
-  });
-  EXPECT_EQ(missing + built, 7);
-}
-
 }  // namespace

@@ -50,35 +50,35 @@ template <typename Nothing, typename... Cases>
 struct case_list {
   using type = testing::Types<Cases...>;
 };
-#define TARN_CASES_OF(name, built) \
-  , engine_case<rng::name> TARN_IF_##built(, engine_case<rng::name, device_type::gpu>)
+#define TARN_CASES_OF(name, on_gpus) \
+  , engine_case<rng::name> TARN_IF_##on_gpus(, engine_case<rng::name, device_type::gpu>)
 
 // clang-format off
 using every_case = case_list<void
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
-  TARN_CASES_OF(name, built)
+                    uniform_bits)                                                     \
+  TARN_CASES_OF(name, gpu)
 #include "engines/engines.def"
 >::type;
 
 using skipping_cases = case_list<void
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
-  TARN_IF_##skip(TARN_CASES_OF(name, built))
+                    uniform_bits)                                                     \
+  TARN_IF_##skip(TARN_CASES_OF(name, gpu))
 #include "engines/engines.def"
 >::type;
 
 using list_skipping_cases = case_list<void
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
-  TARN_IF_##skip_list(TARN_CASES_OF(name, built))
+                    uniform_bits)                                                     \
+  TARN_IF_##skip_list(TARN_CASES_OF(name, gpu))
 #include "engines/engines.def"
 >::type;
 
 using leaping_cases = case_list<void
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
-  TARN_IF_##leapfrog(TARN_CASES_OF(name, built))
+                    uniform_bits)                                                     \
+  TARN_IF_##leapfrog(TARN_CASES_OF(name, gpu))
 #include "engines/engines.def"
 >::type;
 // clang-format on
@@ -105,7 +105,7 @@ class over_cases : public testing::Test {};
 template <typename Call>
 void for_every_engine(const Call& call) {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   {                                                                                          \
     SCOPED_TRACE(#name);                                                                     \
     call(engine_case<rng::name>{});                                                          \

@@ -318,7 +318,7 @@ TEST(refused_combinations, name_the_engine) {
   EXPECT_EQ(uniform_bits_refusal<rng::wichmann_hill>(), text("wichmann_hill"));
   int offered = 0;
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits_, built)                                                    \
+                    uniform_bits_)                                                           \
   offered += rng::detail::is_refused<rng::uniform_bits<std::uint32_t>, rng::name> ? 0 : 1;
 #include "engines/engines.def"
   EXPECT_EQ(offered, 13 - 6);

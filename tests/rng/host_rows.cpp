@@ -117,7 +117,7 @@ std::vector<row_case> rows() {
   using namespace rng;
   using rng::gamma;  // <math.h> has one as well
   return {
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
   row_of<TARN_UNWRAP type>(#type, #family, #method),
 #include "distributions/distributions.def"
   };
@@ -134,7 +134,7 @@ std::vector<forms> forms_of_rows() {
   return {
 #define TARN_FORMS(...) \
   forms{&generate_into_memory<__VA_ARGS__, Engine>, &generate_into_buffer<__VA_ARGS__, Engine>},
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) TARN_FORMS type
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) TARN_FORMS type
 #include "distributions/distributions.def"
   };
 }
@@ -214,7 +214,7 @@ void expect_code(const std::string& family, const std::string& method) {
 TEST(host_rows, have_the_codes_of_their_methods) {
   using namespace rng;
   using rng::gamma;
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
   expect_code<TARN_UNWRAP type>(#family, #method);
 #include "distributions/distributions.def"
 }

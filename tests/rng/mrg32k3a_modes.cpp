@@ -210,7 +210,7 @@ TEST(mrg32k3a_modes, have_kernels_of_uniform_and_gaussian_alone) {
         ++(there ? kernels : refusals);
       }
     };
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) \
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) \
   expect(row_of<TARN_UNWRAP type>{}, #family);
 #include "distributions/distributions.def"
     EXPECT_EQ(kernels, 8 + 6);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Parameters of the distribution classes: what they keep, their defaults, what they refuse and
 // with which words; and the two lists themselves.
+#include <cmath>
 #include <cstdint>
 #include <limits>
 #include <string>
@@ -48,14 +49,14 @@ TEST(lists, words_per_result) {
   EXPECT_EQ((distribution_row<rng::gaussian<float, box_muller>>::per_output_words), 2u);
   EXPECT_EQ((distribution_row<rng::gaussian<double, box_muller>>::per_output_words), 2u);
   std::uint64_t sum = 0;
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built) sum += words;
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu) sum += words;
 #include "distributions/distributions.def"
   EXPECT_EQ(sum, 89u + 5u);  // every other row has 1
 }
 
 TEST(lists, nine_families_go_by_generate_ex) {
   std::vector<std::string> families;
-#define TARN_DISTRIBUTION(family, result, method, type, words, road, built)                    \
+#define TARN_DISTRIBUTION(family, result, method, type, words, road, gpu)                      \
   if (std::string(#road) == "generate_ex" && (families.empty() || families.back() != #family)) \
     families.push_back(#family);
 #include "distributions/distributions.def"
@@ -111,6 +112,38 @@ TEST(parameters, refused_reals) {
   EXPECT_EQ(refusal([] { rng::exponential<float>(0.0f, 0.0f); }),
             expected("exponential", "beta <= 0"));
   EXPECT_EQ(refusal([] { rng::chi_square<double>(0); }), expected("chi_square", "n < 1"));
+}
+
+// A device would draw candidates for them for ever.
+TEST(parameters, refused_as_nothing_would_be_accepted) {
+  const double inf = std::numeric_limits<double>::infinity();
+  const double no_number = std::numeric_limits<double>::quiet_NaN();
+  EXPECT_EQ(refusal([=] { rng::gamma<double>(no_number, 0.0); }), expected("gamma", "alpha <= 0"));
+  EXPECT_EQ(refusal([] { rng::beta<float>(0.0f, 1.0f); }), expected("beta", "p <= 0"));
+  EXPECT_EQ(refusal([] { rng::beta<double>(1.0, -0.5); }), expected("beta", "q <= 0"));
+  EXPECT_EQ(refusal([=] { rng::beta<double>(inf, 2.0); }), expected("beta", "p or q is infinite"));
+  EXPECT_EQ(refusal([=] { rng::beta<double>(2.0, inf); }), expected("beta", "p or q is infinite"));
+  EXPECT_EQ(refusal([] { rng::binomial<>(-1, 0.5); }), expected("binomial", "ntrial < 0"));
+  EXPECT_EQ(refusal([] { rng::binomial<>(5, 1.5); }), expected("binomial", "p > 1 or p < 0"));
+  EXPECT_EQ(refusal([] { rng::binomial<>(5, -0.5); }), expected("binomial", "p > 1 or p < 0"));
+  EXPECT_EQ(refusal([=] { rng::binomial<>(5, no_number); }),
+            expected("binomial", "p > 1 or p < 0"));
+  const auto negative_binomial = [](double a, double p) {
+    return refusal([=] { rng::negative_binomial<>(a, p); });
+  };
+  EXPECT_EQ(negative_binomial(0.0, 0.5), expected("negative_binomial", "a <= 0"));
+  EXPECT_EQ(negative_binomial(no_number, 0.5), expected("negative_binomial", "a <= 0"));
+  EXPECT_EQ(negative_binomial(inf, 0.5), expected("negative_binomial", "a is infinite"));
+  EXPECT_EQ(negative_binomial(1.0, 0.0), expected("negative_binomial", "p > 1 or p <= 0"));
+  EXPECT_EQ(negative_binomial(1.0, 1.5), expected("negative_binomial", "p > 1 or p <= 0"));
+  EXPECT_EQ(negative_binomial(1.0, no_number), expected("negative_binomial", "p > 1 or p <= 0"));
+}
+
+TEST(parameters, ends_that_are_taken) {
+  EXPECT_EQ(rng::binomial<>(0, 0.0).ntrial(), 0);
+  EXPECT_EQ(rng::binomial<>(3, 1.0).p(), 1.0);
+  EXPECT_EQ(rng::negative_binomial<>(0.5, 1.0).p(), 1.0);
+  EXPECT_TRUE(std::isnan(rng::beta<double>(std::nan(""), 2.0).p()));
 }
 
 // The words do not always fit the condition: they have been in use for long and are compared.

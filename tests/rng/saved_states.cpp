@@ -33,7 +33,7 @@ TYPED_TEST_SUITE(saved_states, every_case, case_name);
 template <typename Case>
 std::vector<sycl::queue> roads() {
   std::vector<sycl::queue> queues = {cpu_queue()};
-  if (Case::device_road) {
+  if (Case::gpu) {
     queues.push_back(gpu_queue());
   }
   return queues;

@@ -192,6 +192,9 @@ TEST(sobol_marker, without_it_nothing_is_drawn_on_a_device) {
   rng::generate(pairs, both.engine, 64, normals.get(), {shut.closed}).wait();
   EXPECT_EQ(event, sycl::event());
   shut.open();
+  // Nothing is made of candidates and scratch that nobody has written.
+  rng::generate(rng::gamma<double>(2.5), both.engine, 64, normals.get()).wait();
+  rng::generate(rng::chi_square<double>(1), both.engine, 64, normals.get()).wait();
   EXPECT_TRUE(out.untouched());
   EXPECT_TRUE(normals.untouched());
   marker_word = 0xFFFFFFFF;

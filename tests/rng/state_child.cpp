@@ -54,7 +54,7 @@ int main(int argc, char** argv) try {
   const sycl::queue queue =
       device == "gpu" ? sycl::queue(sycl::gpu_selector_v) : sycl::queue(sycl::cpu_selector_v);
 #define TARN_ENGINE(engine_name, code, label, word_bits, seed_type, gpu, skip, skip_list, \
-                    leapfrog, uniform_bits, built)                                        \
+                    leapfrog, uniform_bits)                                               \
   if (name == #engine_name) {                                                             \
     auto engine = made<rng::engine_name>(queue, argv[1], argv[4]);                        \
     for (const double value : draw(engine, 20)) {                                         \

@@ -85,7 +85,7 @@ inline std::int64_t member(kind engine) {
 inline std::vector<engine_case> every_engine() {
   return {
 #define TARN_ENGINE(name, code, label, word_bits, seed_type, gpu, skip, skip_list, leapfrog, \
-                    uniform_bits, built)                                                     \
+                    uniform_bits)                                                            \
   {#name,                                                                                    \
    code + rows::member(rows::name),                                                          \
    rows::seed(rows::name),                                                                   \

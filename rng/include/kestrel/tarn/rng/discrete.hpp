@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // Discrete distributions: parameters only. Drawing is in generate.hpp; every class keeps the values
 // given at construction. The manual has a page for each: probabilities, words consumed, method,
-// accuracy. Results above the greatest std::int32_t are that integer.
+// accuracy. Results that a type cannot hold are its greatest value, on CPU queues for both types
+// that of std::int32_t.
 #pragma once
 
 #include <cstdint>
@@ -107,10 +108,10 @@ class TARN_EXPORT binomial {
   using method_type = Method;
   ///@}
 
-  /// \param ntrial  trials, 1 or more
+  /// \param ntrial  trials, 0 or more; a CPU queue reports 0 and draws nothing
   /// \param p       probability of a success, in [0, 1]
   ///
-  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
+  /// Raises invalid_argument for ntrial < 0 and for a p outside [0, 1].
   explicit binomial(std::int32_t ntrial = 5, double p = 0.5);
 
   ///@{
@@ -148,7 +149,8 @@ class TARN_EXPORT negative_binomial {
   /// \param a  number of the last success, real, finite and above 0
   /// \param p  probability of a success, in (0, 1]
   ///
-  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
+  /// Raises invalid_argument for parameters outside these ranges, and `generate` on a GPU queue for
+  /// those whose hat does not stand in double precision (docs/distributions/devices.md).
   explicit negative_binomial(double a = 1.0, double p = 0.5);
 
   ///@{
@@ -229,7 +231,9 @@ class TARN_EXPORT multinomial {
   /// \param ntrial  trials in a row, 0 or more
   /// \param p       probabilities of the categories, at least one, none negative, with sum 1
   ///
-  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
+  /// Raises nothing: a CPU queue reports other parameters and draws nothing. `generate` on a GPU
+  /// queue raises invalid_argument for more than 16 trials, for fewer than 16 categories a trial,
+  /// and for counts below 0.
   explicit multinomial(std::int32_t ntrial, const std::vector<double>& p);
 
   ///@{

@@ -37,7 +37,7 @@ class TARN_EXPORT gamma {
   /// \param a      displacement, finite: the least value
   /// \param beta   scale, finite and above 0
   ///
-  /// Raises invalid_argument for alpha <= 0 and beta <= 0.
+  /// Raises invalid_argument for alpha <= 0, for beta <= 0 and for an alpha that is not a number.
   explicit gamma(RealType alpha = RealType(1), RealType a = RealType(0),
                  RealType beta = RealType(1));
 
@@ -82,7 +82,10 @@ class TARN_EXPORT beta {
   /// \param a  displacement, finite
   /// \param b  scale, finite and above 0
   ///
-  /// Raises nothing: a CPU queue reports other parameters and draws nothing.
+  /// Raises invalid_argument for p <= 0, q <= 0 and infinite shapes, and `generate` on a GPU queue
+  /// for shapes so small or large that next to nothing would be accepted. For a shape that is not a
+  /// number a GPU queue draws uniforms; a CPU queue reports it, and other parameters, and draws
+  /// nothing.
   explicit beta(RealType p = RealType(1), RealType q = RealType(1), RealType a = RealType(0),
                 RealType b = RealType(1));
 
