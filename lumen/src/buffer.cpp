@@ -130,7 +130,6 @@ class host_hold {
   host_hold(const host_hold&) = delete;
   host_hold& operator=(const host_hold&) = delete;
   ~host_hold() {
-    const task_ref mine = share(*task_);
     {
       const std::lock_guard<std::mutex> lock(access_record::order_mutex());
       core_->record().remove_holder(*task_);
@@ -140,6 +139,7 @@ class host_hold {
 
  private:
   void end() {
+    const task_ref mine = share(*task_);
     task_->finish_linking();
     task_->wait();
   }
