@@ -26,7 +26,7 @@ endif()
 
 # Contraction is a decision of the source, never of the compiler: one multiply-add gives the
 # same bits on every device only if it is fused where, and only where, the code says so.
-add_compile_options(-ffp-contract=off)
+add_compile_options($<$<COMPILE_LANGUAGE:C,CXX>:-ffp-contract=off>)
 
 if(TARN_SANITIZE)
   add_compile_options(-fsanitize=${TARN_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=all)
@@ -41,10 +41,27 @@ endif()
 
 # Warnings for our own targets only, never for those who link us.
 function(tarn_warnings target)
-  target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic -Wshadow -Wconversion
-                                           $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>)
+  set(ours -Wall -Wextra -Wpedantic -Wshadow -Wconversion)
   if(TARN_WERROR)
-    target_compile_options(${target} PRIVATE -Werror)
+    list(APPEND ours -Werror)
+  endif()
+  target_compile_options(${target} PRIVATE $<$<COMPILE_LANGUAGE:C,CXX>:${ours}>
+                                           $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>)
+  # What nvcc makes of a source for the host compiler is not all ours.
+  if(TARN_CUDA)
+    target_compile_options(${target} PRIVATE $<$<COMPILE_LANGUAGE:CUDA>:-Xcompiler=-Wall,-Wextra>)
+    if(TARN_WERROR)
+      target_compile_options(${target} PRIVATE
+        "$<$<COMPILE_LANGUAGE:CUDA>:SHELL:-Werror all-warnings -Xcompiler=-Werror>")
+    endif()
+  endif()
+endfunction()
+
+# tarn_kernel_sources(FILE...): sources that launch kernels, compiled as CUDA where that is asked
+# for. To be called in the folder of their target.
+function(tarn_kernel_sources)
+  if(TARN_CUDA)
+    set_source_files_properties(${ARGN} PROPERTIES LANGUAGE CUDA)
   endif()
 endfunction()
 

@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-// The seam between the API and a backend: what a backend must know how to do. Inner functions
-// report failures by value or as sycl::exception from launch; the API turns them into events.
+// The seam between the API and a backend: what a backend must know how to do. Commands that fail
+// throw sycl::exception; the API turns that into the error of an event.
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <vector>
 
@@ -13,6 +14,36 @@
 
 LUMEN_NAMESPACE_BEGIN
 namespace detail {
+
+// A place in a stream, reached when all commands that went in before are done.
+class stream_mark {
+ public:
+  virtual ~stream_mark() = default;
+  virtual bool reached() noexcept = 0;
+  // Returns when it is reached; throws the error of the commands before it.
+  virtual void wait() = 0;
+  // When it was reached, on the clock of now_nanoseconds; for streams that keep times.
+  virtual std::uint64_t time() = 0;
+};
+
+// The commands of one queue on its device, which run one after the other. The caller keeps what a
+// command works on until it is done.
+class command_stream {
+ public:
+  virtual ~command_stream() = default;
+
+  virtual void launch(const launch_shape& shape, kernel_command& kernel) = 0;
+  virtual void copy(void* to, const void* from, std::size_t bytes) = 0;
+  virtual void fill(void* to, const void* pattern, std::size_t pattern_bytes,
+                    std::size_t count) = 0;
+  virtual void prefetch(void* pointer, std::size_t bytes) = 0;
+  virtual void advise(void* pointer, std::size_t bytes, int advice) = 0;
+
+  // Commands that go in from now on come after a mark of a stream of the same driver.
+  virtual void wait_for(stream_mark& mark) = 0;
+  // Null where every command is done when its call returns.
+  virtual std::shared_ptr<stream_mark> mark() = 0;
+};
 
 class backend_driver {
  public:
@@ -27,21 +58,16 @@ class backend_driver {
                          std::size_t bytes) = 0;
   virtual void release(const device_record& device, usm::alloc kind, void* pointer) noexcept = 0;
 
-  // Each of these returns when its work is done.
+  // `timed` streams keep the times of their marks.
+  virtual std::unique_ptr<command_stream> make_stream(const device_record& device, bool timed) = 0;
+  // Copies between the memory of the device and the host's; done on return.
   virtual void copy(const device_record& device, void* to, const void* from, std::size_t bytes) = 0;
-  virtual void fill(const device_record& device, void* to, const void* pattern,
-                    std::size_t pattern_bytes, std::size_t count) = 0;
-  virtual void prefetch(const device_record& device, void* pointer, std::size_t bytes) = 0;
-  virtual void advise(const device_record& device, void* pointer, std::size_t bytes,
-                      int advice) = 0;
-  // Throws what the kernel threw.
-  virtual void launch(const device_record& device, const launch_shape& shape,
-                      kernel_command& kernel) = 0;
-  virtual void synchronise(const device_record& device) = 0;
 };
 
 // One function a backend; the list of them is in device.cpp.
 std::unique_ptr<backend_driver> make_host_driver();
+std::unique_ptr<backend_driver> make_detached_driver();
+std::unique_ptr<backend_driver> make_cuda_driver();
 
 }  // namespace detail
 LUMEN_NAMESPACE_END

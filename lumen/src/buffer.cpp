@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // Buffer memory and the order of its users.
 #include <algorithm>
+#include <cstdio>
 #include <cstdlib>
 
 #include "access_record.hpp"
+#include "buffer_copies.hpp"
 #include "handler_access.hpp"
+#include "queue_core.hpp"
 #include "sycl/detail/buffer_core.hpp"
 #include "sycl/detail/exception.hpp"
 
@@ -73,7 +76,43 @@ task_ref access_record::unfinished() const {
 
 buffer_core::buffer_core(std::size_t bytes)
     : bytes_(bytes), record_(std::make_unique<access_record>()) {}
-buffer_core::~buffer_core() = default;
+buffer_core::~buffer_core() {
+  delete copies_.load(std::memory_order_acquire);
+}
+
+void buffer_core::to_host(access_kind use) {
+  if (buffer_copies* const made = copies_.load(std::memory_order_acquire)) {
+    made->to_host(use);
+  }
+}
+
+void* buffer_core::address_on(const device_record& device) {
+  buffer_copies* made = copies_.load(std::memory_order_acquire);
+  if (made == nullptr) {
+    auto fresh =
+        std::make_unique<buffer_copies>(data_, bytes_, defined_.load(std::memory_order_relaxed));
+    if (copies_.compare_exchange_strong(made, fresh.get(), std::memory_order_acq_rel)) {
+      made = fresh.release();
+    }
+  }
+  return made->address_on(device);
+}
+
+void* buffer_core::host_address(const device_record& device, void* address) {
+  buffer_copies* const made = copies_.load(std::memory_order_acquire);
+  return made == nullptr ? address : made->host_address(device, address);
+}
+
+bool buffer_core::come_home() noexcept {
+  try {
+    to_host({false, true});
+    return true;
+  } catch (const std::exception& error) {
+    std::fprintf(stderr, "lumen: the contents of a buffer are lost on its device: %s\n",
+                 error.what());
+    return false;
+  }
+}
 
 namespace {
 std::vector<task_ref> conflicts_of(buffer_core& core, bool writes) {
@@ -114,30 +153,37 @@ void write_back_after(const std::vector<task_ref>& users,
 // One host accessor: stands in the buffer's record as a task that is done when this goes.
 class host_hold {
  public:
-  host_hold(std::shared_ptr<buffer_core> core, bool writes)
+  host_hold(std::shared_ptr<buffer_core> core, access_kind use)
       : core_(std::move(core)), task_(new task(nullptr, command_group{})) {
     std::vector<task_ref> before;
     try {
       const std::lock_guard<std::mutex> lock(access_record::order_mutex());
-      before = core_->record().conflicts(writes);
-      core_->record().add_holder(*task_, writes);
+      before = core_->record().conflicts(use.writes);
+      core_->record().add_holder(*task_, use.writes);
     } catch (...) {
       end();
       throw;
     }
     wait_for_others(before);
+    try {
+      core_->to_host(use);
+    } catch (...) {
+      leave();
+      throw;
+    }
   }
   host_hold(const host_hold&) = delete;
   host_hold& operator=(const host_hold&) = delete;
-  ~host_hold() {
+  ~host_hold() { leave(); }
+
+ private:
+  void leave() {
     {
       const std::lock_guard<std::mutex> lock(access_record::order_mutex());
       core_->record().remove_holder(*task_);
     }
     end();
   }
-
- private:
   void end() {
     const task_ref mine = share(*task_);
     task_->finish_linking();
@@ -175,12 +221,57 @@ buffer_handle::~buffer_handle() {
   core->write_back();
 }
 
-void require_access(handler& group, buffer_core& core, bool writes) {
-  handler_access::group(group).accesses.push_back({core.shared_from_this(), writes});
+namespace {
+// Several accessors of a group to one buffer are one access: what one of them gives up another may
+// read.
+void note_access(handler& group, buffer_core& core, access_kind use, const device_record* place) {
+  if (place == nullptr && use.writes) {
+    core.define();
+  }
+  std::vector<access_request>& accesses = handler_access::group(group).accesses;
+  for (access_request& access : accesses) {
+    if (access.core.get() == &core && access.place == place) {
+      access.writes = access.writes || use.writes;
+      access.keeps = access.keeps || use.keeps;
+      return;
+    }
+  }
+  accesses.push_back({core.shared_from_this(), use.writes, use.keeps, place});
+}
+}  // namespace
+
+void require_on_host(handler& group, buffer_core& core, access_kind use) {
+  note_access(group, core, use, nullptr);
 }
 
-std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core, bool writes) {
-  return std::make_shared<host_hold>(core, writes);
+void* require_on_device(handler& group, buffer_core& core, void* host, access_kind use) {
+  const device_record& device = handler_access::group(group).queue->record;
+  if (!device.detached) {
+    require_on_host(group, core, use);
+    return host;
+  }
+  char* const there = static_cast<char*>(core.address_on(device));
+  note_access(group, core, use, &device);
+  return there + (static_cast<char*>(host) - static_cast<char*>(core.data()));
+}
+
+void* back_on_host(handler& group, buffer_core& core, void* address) {
+  for (access_request& access : handler_access::group(group).accesses) {
+    if (access.core.get() == &core && access.place != nullptr) {
+      access.place = nullptr;
+      if (access.writes) {
+        core.define();
+      }
+    }
+  }
+  return core.host_address(handler_access::group(group).queue->record, address);
+}
+
+std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core, access_kind use) {
+  if (use.writes) {
+    core->define();
+  }
+  return std::make_shared<host_hold>(core, use);
 }
 
 void* allocate_buffer(std::size_t bytes) {

@@ -16,10 +16,17 @@ const std::vector<const device_record*>& all_devices() {
   // The records and drivers are never released: handles and threads may outlive main.
   static const auto& devices = *[] {
     auto* found = new std::vector<const device_record*>;
-    backend_driver* driver = make_host_driver().release();
-    for (std::unique_ptr<device_record>& record : driver->enumerate()) {
-      record->driver = driver;
-      found->push_back(record.release());
+    for (const auto& make : {
+           make_host_driver, make_detached_driver,
+#if defined(LUMEN_CUDA)
+               make_cuda_driver,
+#endif
+         }) {
+      backend_driver* driver = make().release();
+      for (std::unique_ptr<device_record>& record : driver->enumerate()) {
+        record->driver = driver;
+        found->push_back(record.release());
+      }
     }
     return found;
   }();

@@ -33,8 +33,13 @@ struct device_record {
   device_properties properties;
   backend_driver* driver = nullptr;
   const platform_record* platform = nullptr;
-  // What the default selector rates the device; real GPUs of later backends go above the host.
+  // What the default selector rates the device: a GPU 200, the host 100, virtual devices less.
   int default_rating = 0;
+  // Which device of its platform it is.
+  int number = 0;
+  // Whether its commands go through a stream while the host goes on, and buffers have a copy in
+  // its memory.
+  bool detached = false;
 
   static const device_record& of(const device& dev) { return *dev.record_; }
   static device handle(const device_record& record) { return device(&record); }

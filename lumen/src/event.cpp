@@ -8,6 +8,9 @@
 
 LUMEN_NAMESPACE_BEGIN
 
+backend event::get_backend() const noexcept {
+  return task_ && task_->queue() ? task_->queue()->dev.get_backend() : backend::host;
+}
 void event::wait() {
   if (task_) {
     task_->wait();
@@ -48,6 +51,7 @@ LUMEN_EXPORT info::event_command_status event::get_info<info::event::command_exe
   }
   switch (task_->state()) {
     case detail::task_state::running:
+    case detail::task_state::issued:
       return info::event_command_status::running;
     case detail::task_state::done:
       return info::event_command_status::complete;

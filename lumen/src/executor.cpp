@@ -41,7 +41,8 @@ executor& executor::instance() {
   return only;
 }
 
-executor::executor() : thread_count_(number_of_threads()) {
+// The process may do all its work in streams and never start a worker.
+executor::executor() : thread_count_(number_of_threads()), process_(getpid()) {
   std::atexit([] { instance().stop(); });
 }
 
@@ -65,10 +66,8 @@ void executor::submit(task& ready) {
     std::unique_lock<std::mutex> lock(mutex_);
     if (stopped_) {
       // The workers are gone: the task runs here, now.
-      ready.set_state(task_state::running);
-      ++running_;
       lock.unlock();
-      ready.run();
+      run_now(ready);
       return;
     }
     ready.ticket = ++last_ticket_;
@@ -85,6 +84,20 @@ void executor::submit(task& ready) {
   if (wake) {
     sleepers_.notify_one();
   }
+}
+
+void executor::run_now(task& ready) {
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    ready.set_state(task_state::running);
+    ++running_;
+  }
+  ready.run();
+}
+
+bool executor::stopped() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return stopped_;
 }
 
 void executor::unlink(task& ready) {

@@ -52,6 +52,10 @@ class executor {
 
   // The task is ready: somebody will run it.
   void submit(task& ready);
+  // The task is ready: it runs on the calling thread.
+  void run_now(task& ready);
+  // True from the end of main on.
+  bool stopped();
   // Takes a ready task for the calling thread; false when it is not ready (any more).
   bool claim(task& wanted);
   // Runs the loop on the calling thread and as many workers as are free and the loop admits.
@@ -83,7 +87,7 @@ class executor {
   bool sentinel_ = false;
   bool stopping_ = false;
   bool stopped_ = false;
-  pid_t process_ = 0;
+  pid_t process_;  // where the workers are
   std::vector<std::thread> threads_;
 };
 

@@ -65,19 +65,37 @@ void check_groups(const detail::launch_shape& shape, std::size_t largest_group) 
   }
 }
 
-// A host command inside the library: calls a function object that is given the backend.
+// A command on memory: a function object that is given the stream.
 template <typename Function>
-class memory_command final : public detail::host_command {
+class memory_command final : public detail::device_command {
  public:
   explicit memory_command(Function function) : function_(std::move(function)) {}
-  void run(const interop_handle&) override { function_(); }
+  void enqueue(detail::command_stream& stream, const detail::launch_shape&) override {
+    function_(stream);
+  }
 
  private:
   Function function_;
 };
 template <typename Function>
-std::unique_ptr<detail::host_command> memory_work(Function function) {
+std::unique_ptr<detail::device_command> memory_work(Function function) {
   return std::make_unique<memory_command<Function>>(std::move(function));
+}
+
+void check_code(const detail::kernel_command& kernel, const detail::command_group& group) {
+  const detail::device_record& device = group.queue->record;
+  if (!kernel.serves(device.platform->kind)) {
+    throw exception(make_error_code(errc::kernel_not_supported),
+                    "the program holds no code of this kernel for " + device.properties.name +
+                        ": compile the unit that launches it with nvcc (Tarn's own kernels: the "
+                        "CMake preset cuda), or choose another device");
+  }
+  const auto on_host = [](const detail::access_request& access) { return access.place == nullptr; };
+  if (device.detached && std::any_of(group.accesses.begin(), group.accesses.end(), on_host)) {
+    throw exception(make_error_code(errc::feature_not_supported),
+                    "a placeholder accessor was made before it was known where it is used, which "
+                    "is too late for a device with memory of its own: make it from the handler");
+  }
 }
 
 void check_pointer(const void* pointer, std::size_t bytes, const char* text) {
@@ -120,12 +138,17 @@ void handler::launch(const detail::launch_shape& shape,
                     "the local accessors need " + std::to_string(group_.local_bytes) +
                         " bytes; the device has " + std::to_string(limits.local_mem_size));
   }
+  check_code(*work, group_);
+  group_.shape = shape;
+  group_.shape.local_bytes = group_.local_bytes;
+  run_on_device(std::move(work));
+}
+
+void handler::run_on_device(std::unique_ptr<detail::device_command> work) {
   if (group_.kind != detail::work_kind::none) {
     detail::throw_invalid("a command group has more than one command");
   }
-  group_.kind = detail::work_kind::kernel;
-  group_.shape = shape;
-  group_.shape.local_bytes = group_.local_bytes;
+  group_.kind = detail::work_kind::device;
   group_.work = std::move(work);
 }
 
@@ -140,9 +163,8 @@ void handler::run_on_host(std::unique_ptr<detail::host_command> work) {
 void handler::memcpy(void* to, const void* from, std::size_t bytes) {
   check_pointer(to, bytes, "memcpy: the destination is null");
   check_pointer(from, bytes, "memcpy: the source is null");
-  const detail::device_record& device = group_.queue->record;
-  run_on_host(
-      memory_work([&device, to, from, bytes] { device.driver->copy(device, to, from, bytes); }));
+  run_on_device(memory_work(
+      [to, from, bytes](detail::command_stream& stream) { stream.copy(to, from, bytes); }));
 }
 void handler::memset(void* pointer, int value, std::size_t bytes) {
   const auto pattern = static_cast<unsigned char>(value);
@@ -151,22 +173,20 @@ void handler::memset(void* pointer, int value, std::size_t bytes) {
 void handler::fill_bytes(void* pointer, const void* pattern, std::size_t pattern_bytes,
                          std::size_t count) {
   check_pointer(pointer, count, "fill: the destination is null");
-  const detail::device_record& device = group_.queue->record;
   const auto* first = static_cast<const unsigned char*>(pattern);
   std::vector<unsigned char> kept(first, first + pattern_bytes);
-  run_on_host(memory_work([&device, pointer, kept = std::move(kept), count] {
-    device.driver->fill(device, pointer, kept.data(), kept.size(), count);
-  }));
+  run_on_device(
+      memory_work([pointer, kept = std::move(kept), count](detail::command_stream& stream) {
+        stream.fill(pointer, kept.data(), kept.size(), count);
+      }));
 }
 void handler::prefetch(void* pointer, std::size_t bytes) {
-  const detail::device_record& device = group_.queue->record;
-  run_on_host(
-      memory_work([&device, pointer, bytes] { device.driver->prefetch(device, pointer, bytes); }));
+  run_on_device(memory_work(
+      [pointer, bytes](detail::command_stream& stream) { stream.prefetch(pointer, bytes); }));
 }
 void handler::mem_advise(void* pointer, std::size_t bytes, int advice) {
-  const detail::device_record& device = group_.queue->record;
-  run_on_host(memory_work([&device, pointer, bytes, advice] {
-    device.driver->advise(device, pointer, bytes, advice);
+  run_on_device(memory_work([pointer, bytes, advice](detail::command_stream& stream) {
+    stream.advise(pointer, bytes, advice);
   }));
 }
 

@@ -34,6 +34,7 @@ queue_core::queue_core(const context& owner, const device& where, const async_ha
       properties(wanted),
       in_order(detail::property_access::has<property::queue::in_order>(wanted)),
       profiling(detail::property_access::has<property::queue::enable_profiling>(wanted)),
+      stream(record.driver->make_stream(record, profiling)),
       handler_(handler ? handler : context_state::of(owner).handler) {}
 
 void queue_core::add(task& added) {

@@ -8,6 +8,7 @@
 #include <mutex>
 #include <vector>
 
+#include "backend.hpp"
 #include "context_state.hpp"
 #include "sycl/detail/queue.hpp"
 #include "task.hpp"
@@ -38,6 +39,9 @@ class queue_core : public std::enable_shared_from_this<queue_core> {
   const property_list properties;
   const bool in_order;
   const bool profiling;
+  const std::unique_ptr<command_stream> stream;
+  // Held while a task of a detached device goes into the stream, which is one step for the others.
+  std::mutex issue_mutex;
 
  private:
   void call_handler(std::vector<std::exception_ptr> errors);

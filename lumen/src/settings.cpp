@@ -47,11 +47,21 @@ bool read_setting(const piece& part, virtual_device_setting& device, virtual_dev
   };
   const std::size_t equals = part.text.find('=');
   const std::string name = part.text.substr(0, equals);
-  if (name != "compute_units" && name != "max_work_group_size") {
+  if (name != "compute_units" && name != "max_work_group_size" && name != "memory") {
     return fail("unknown setting '" + name + "'", part.column);
   }
   if (equals == std::string::npos) {
     return fail("setting '" + name + "' has no value", part.column + name.size());
+  }
+  if (name == "memory") {
+    if (part.text.substr(equals + 1) != "own") {
+      return fail("'memory' takes the value own", part.column + equals + 1);
+    }
+    if (device.own_memory) {
+      return fail("setting 'memory' is given twice", part.column);
+    }
+    device.own_memory = true;
+    return true;
   }
   const bool units = name == "compute_units";
   const std::uint32_t limit = units ? 65536 : 4096;
@@ -114,18 +124,39 @@ virtual_device_parse parse_virtual_devices(const std::string& text) {
   return result;
 }
 
-std::vector<virtual_device_setting> virtual_devices_from_environment() {
-  const char* text = std::getenv("LUMEN_VIRTUAL_DEVICES");
-  if (text == nullptr || *text == '\0') {
-    return {};
-  }
-  virtual_device_parse result = parse_virtual_devices(text);
-  if (!result.error.empty()) {
+const std::vector<virtual_device_setting>& virtual_devices_from_environment() {
+  static const auto& devices = *new std::vector<virtual_device_setting>([] {
+    const char* text = std::getenv("LUMEN_VIRTUAL_DEVICES");
+    if (text == nullptr || *text == '\0') {
+      return std::vector<virtual_device_setting>();
+    }
+    virtual_device_parse result = parse_virtual_devices(text);
+    if (!result.error.empty()) {
+      std::fprintf(stderr,
+                   "lumen: LUMEN_VIRTUAL_DEVICES: column %zu: %s; no virtual device is made\n",
+                   result.column, result.error.c_str());
+    }
+    return std::move(result.devices);
+  }());
+  return devices;
+}
+
+bool cuda_shared_is_managed() {
+  static const bool managed = [] {
+    const char* text = std::getenv("LUMEN_CUDA_SHARED");
+    if (text == nullptr || std::string(text) == "pinned") {
+      return false;
+    }
+    if (std::string(text) == "managed") {
+      return true;
+    }
     std::fprintf(stderr,
-                 "lumen: LUMEN_VIRTUAL_DEVICES: column %zu: %s; no virtual device is made\n",
-                 result.column, result.error.c_str());
-  }
-  return std::move(result.devices);
+                 "lumen: LUMEN_CUDA_SHARED: column 1: '%s' is neither pinned nor managed; the "
+                 "variable is ignored\n",
+                 text);
+    return false;
+  }();
+  return managed;
 }
 
 }  // namespace detail

@@ -21,6 +21,7 @@ struct virtual_device_setting {
   bool is_gpu = true;
   std::uint32_t compute_units = 0;      // 0: as the host
   std::size_t max_work_group_size = 0;  // 0: as the host
+  bool own_memory = false;              // buffers have a copy there; commands go through a stream
 };
 
 struct virtual_device_parse {
@@ -30,9 +31,14 @@ struct virtual_device_parse {
 };
 
 // kind[,setting=number]... joined by ';'. Kinds: gpu, accelerator. Settings: compute_units
-// (1 to 65536; no kernel of the device has more threads), max_work_group_size (1 to 4096).
+// (1 to 65536; no kernel of the device has more threads), max_work_group_size (1 to 4096), memory
+// (own: as a GPU with memory of its own has it).
 virtual_device_parse parse_virtual_devices(const std::string& text);
-std::vector<virtual_device_setting> virtual_devices_from_environment();
+const std::vector<virtual_device_setting>& virtual_devices_from_environment();
+
+// LUMEN_CUDA_SHARED=managed: shared allocations on CUDA devices are managed memory, which moves
+// between host and device by pages, otherwise (pinned) memory of the host that the device reaches.
+bool cuda_shared_is_managed();
 
 }  // namespace detail
 LUMEN_NAMESPACE_END

@@ -2,11 +2,15 @@
 // The life of a task: linking, waiting, running, and waking what comes after.
 #include "task.hpp"
 
+#include <algorithm>
 #include <chrono>
 #include <new>
 
+#include "access_record.hpp"
 #include "backend.hpp"
+#include "buffer_copies.hpp"
 #include "clock.hpp"
+#include "completer.hpp"
 #include "executor.hpp"
 #include "futex.hpp"
 #include "queue_core.hpp"
@@ -54,13 +58,17 @@ void task::depend_on(task& other) {
   if (&other == this) {
     return;
   }
+  const bool in_stream = follows(other);
   {
     const std::lock_guard<std::mutex> lock(other.mutex_);
     if (other.done()) {
       return;
     }
-    other.successors_.push_back(share(*this));  // may throw: nothing is counted then
-    unmet_.fetch_add(1, std::memory_order_relaxed);
+    if (!in_stream || other.state() != task_state::issued) {
+      // May throw: nothing is counted then.
+      (in_stream ? other.followers_ : other.successors_).push_back(share(*this));
+      unmet_.fetch_add(1, std::memory_order_relaxed);
+    }
   }
   const std::lock_guard<std::mutex> lock(mutex_);
   dependencies_.push_back(share(other));
@@ -81,8 +89,29 @@ void task::abandon() noexcept {
   finish_linking();
 }
 
+// Whether the work goes through a stream while the host goes on.
+bool task::streamed() const noexcept {
+  return kind_ == work_kind::device && queue_ && queue_->record.detached;
+}
+
+// Whether the device itself keeps this task behind the other.
+bool task::follows(const task& other) const noexcept {
+  return streamed() && other.streamed() && queue_->record.driver == other.queue_->record.driver;
+}
+
 void task::dependency_done() {
-  if (unmet_.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+  if (unmet_.fetch_sub(1, std::memory_order_acq_rel) != 1) {
+    return;
+  }
+  // Putting work into a stream is short, and the order of the streams is that of the submissions.
+  // Where a long chain becomes ready at once the rest of it goes through the ready list.
+  static thread_local unsigned chained = 0;
+  constexpr unsigned longest_chain = 32;
+  if (streamed() && chained < longest_chain) {
+    ++chained;
+    executor::instance().run_now(*this);
+    --chained;
+  } else {
     executor::instance().submit(*this);
   }
 }
@@ -130,7 +159,9 @@ task_ref task::open_dependency() {
     if (its == task_state::ready) {
       return candidate;
     }
-    if (its == task_state::pending || (its == task_state::running && !found)) {
+    const bool holds_up =
+        its == task_state::running || (its == task_state::issued && !follows(*candidate.get()));
+    if (its == task_state::pending || (holds_up && !found)) {
       found = candidate;
     }
   }
@@ -186,6 +217,8 @@ void task::wait() {
       if (threads.claim(now)) {
         now.run();
       }
+    } else if (its == task_state::issued && now.finish_issued()) {
+      continue;
     } else if (task_ref next = its == task_state::pending ? now.open_dependency() : task_ref()) {
       keep_if_possible(path, std::move(last));
       last = std::move(next);
@@ -198,14 +231,48 @@ void task::wait() {
 }
 
 void task::execute() {
-  if (kind_ == work_kind::host) {
-    static_cast<host_command&>(*work_).run(interop_handle(0));
-  } else if (kind_ == work_kind::kernel) {
-    const device_record& device = queue_->record;
-    auto& kernel = static_cast<kernel_command&>(*work_);
-    device.driver->launch(device, shape_, kernel);
-    kernel.finish();
+  for (const access_request& access : accesses_) {
+    if (access.place == nullptr) {
+      access.core->to_host({access.writes, access.keeps});
+    }
   }
+  if (kind_ == work_kind::host) {
+    static_cast<host_command&>(*work_).run(
+        interop_handle(queue_ ? queue_->dev.get_backend() : backend::host));
+  } else if (streamed()) {
+    const std::lock_guard<std::mutex> lock(queue_->issue_mutex);
+    try {
+      issue();
+    } catch (...) {
+      // What went in before the failure uses what the task is about to give back.
+      end_mark_.reset();
+      if (const auto rest = queue_->stream->mark()) {
+        rest->wait();
+      }
+      throw;
+    }
+  } else if (kind_ == work_kind::device) {
+    static_cast<device_command&>(*work_).enqueue(*queue_->stream, shape_);
+  }
+}
+
+void task::issue() {
+  command_stream& stream = *queue_->stream;
+  for (const task_ref& dependency : dependencies_) {
+    if (dependency->state() == task_state::issued && dependency->queue_ != queue_) {
+      stream.wait_for(*dependency->end_mark_);
+    }
+  }
+  for (const access_request& access : accesses_) {
+    if (access.place != nullptr) {
+      access.core->copies().to_device(*access.place, stream, {access.writes, access.keeps});
+    }
+  }
+  if (queue_->profiling) {
+    begin_mark_ = stream.mark();
+  }
+  static_cast<device_command&>(*work_).enqueue(stream, shape_);
+  end_mark_ = stream.mark();
 }
 
 void task::run() {
@@ -221,8 +288,74 @@ void task::run() {
   } catch (...) {
     error = std::current_exception();
   }
-  if (queue_ && queue_->profiling) {
+  innermost = frame.outer;
+  if (end_mark_) {
+    issued();
+  } else {
+    finish(std::move(error));
+  }
+}
+
+void task::issued() {
+  std::vector<task_ref> followers;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    followers.swap(followers_);
+    set_state(task_state::issued);
+  }
+  if (executor::instance().stopped()) {
+    finish_issued();  // the process ends: nobody looks later
+  } else {
+    completer::instance().add(*this);
+  }
+  for (const task_ref& follower : followers) {
+    follower->dependency_done();
+  }
+}
+
+bool task::reached() const noexcept {
+  return end_mark_->reached();
+}
+
+bool task::finish_issued() {
+  const task_ref self = share(*this);
+  std::exception_ptr error;
+  try {
+    end_mark_->wait();
+  } catch (...) {
+    error = std::current_exception();
+  }
+  if (finishing_.exchange(true)) {
+    return false;
+  }
+  finish(std::move(error));
+  return true;
+}
+
+void task::note_times() {
+  if (end_mark_) {
+    const std::uint64_t began = std::max(submit_time.load(), begin_mark_->time());
+    start_time.store(began, std::memory_order_relaxed);
+    end_time.store(std::max(began, end_mark_->time()), std::memory_order_relaxed);
+  } else {
     end_time.store(now_nanoseconds(), std::memory_order_relaxed);
+  }
+}
+
+// The work is over: tells of its error, gives back what it held, and lets go what comes after.
+void task::finish(std::exception_ptr error) {
+  const task_ref self = share(*this);
+  running_frame frame{this, innermost, false};
+  innermost = &frame;
+  try {
+    if (!error && kind_ == work_kind::device) {
+      static_cast<device_command&>(*work_).finish();
+    }
+    if (queue_ && queue_->profiling) {
+      note_times();
+    }
+  } catch (...) {
+    error = std::current_exception();
   }
   if (error && queue_) {
     queue_->report(std::move(error));
@@ -236,15 +369,20 @@ void task::run() {
     queue_->remove(*this);
   }
   std::vector<task_ref> successors;
+  std::vector<task_ref> followers;
   std::vector<task_ref> dependencies;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     successors.swap(successors_);
+    followers.swap(followers_);
     dependencies.swap(dependencies_);
     set_state(task_state::done);
   }
   for (const task_ref& successor : successors) {
     successor->dependency_done();
+  }
+  for (const task_ref& follower : followers) {
+    follower->dependency_done();
   }
   executor::instance().finished();
   release();  // the count that kept the task alive while it was unfinished

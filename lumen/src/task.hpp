@@ -1,6 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // A submitted command group: its work, what it waits for and what waits for it. A task is
 // pending until its dependencies are done, ready until a thread claims it, running, then done.
+// Where the device works through a stream, running ends with the work in the stream: the task is
+// issued until somebody has seen that the stream has done it. Tasks of streams need not see each
+// other done: one that comes after another begins once that is issued, and the device keeps the
+// order.
 #pragma once
 
 #include <atomic>
@@ -16,8 +20,9 @@ LUMEN_NAMESPACE_BEGIN
 namespace detail {
 
 class executor;
+class stream_mark;
 
-enum class task_state : std::uint32_t { pending, ready, running, done };
+enum class task_state : std::uint32_t { pending, ready, running, issued, done };
 
 class task {
  public:
@@ -47,8 +52,13 @@ class task {
   bool done() const noexcept { return state() == task_state::done; }
   // Blocks until done, running the task or what it depends on where nobody else does.
   void wait();
-  // Runs a claimed task to its end on the calling thread.
+  // Runs a claimed task to its end, or into its stream, on the calling thread.
   void run();
+  // Whether the stream has done an issued task.
+  bool reached() const noexcept;
+  // Waits until the stream has done an issued task, and ends the task unless another thread is at
+  // it: false then.
+  bool finish_issued();
   // True while the calling thread is inside run() of this task.
   bool runs_on_this_thread() const noexcept;
   // How many tasks the calling thread is inside of.
@@ -76,11 +86,17 @@ class task {
 
  private:
   friend class executor;
-  static constexpr std::uint32_t state_mask = 3;
-  static constexpr std::uint32_t waited_bit = 4;
-  static constexpr std::uint32_t linked_bit = 8;
+  static constexpr std::uint32_t state_mask = 7;
+  static constexpr std::uint32_t waited_bit = 8;
+  static constexpr std::uint32_t linked_bit = 16;
 
+  bool streamed() const noexcept;
+  bool follows(const task& other) const noexcept;
   void execute();
+  void issue();
+  void issued();
+  void finish(std::exception_ptr error);
+  void note_times();
   void dependency_done();
   void set_state(task_state next) noexcept;
   task_ref open_dependency();
@@ -97,9 +113,14 @@ class task {
   launch_shape shape_;
   std::unique_ptr<command> work_;
   std::vector<access_request> accesses_;  // keep the memory of buffers
-  std::mutex mutex_;                      // guards the two lists and the step to done
+  std::mutex mutex_;                      // guards the lists and the steps to issued and done
   std::vector<task_ref> dependencies_;
-  std::vector<task_ref> successors_;
+  std::vector<task_ref> successors_;  // begin when this is done
+  std::vector<task_ref> followers_;   // begin when this is issued
+  // Where the work begins and ends in the stream; unchanged from issued on.
+  std::shared_ptr<stream_mark> begin_mark_;
+  std::shared_ptr<stream_mark> end_mark_;
+  std::atomic<bool> finishing_{false};
 };
 
 inline task_ref share(task& t) noexcept {

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// atomic_ref under contention, its every operation alone, fences, and the function objects.
+// atomic_ref under contention among threads and among the items of kernels, its every operation
+// alone, fences, and the function objects.
 #include <cstddef>
 #include <cstdint>
 #include <limits>
@@ -7,9 +8,7 @@
 #include <type_traits>
 #include <vector>
 
-#include <sycl/sycl.hpp>
-
-#include <gtest/gtest.h>
+#include "every_device.hpp"
 
 namespace {
 
@@ -30,6 +29,29 @@ void on_threads(Work work) {
     thread.join();
   }
 }
+
+// Every item of a kernel changes the same few elements.
+template <typename T>
+struct contend {
+  enum { added, least, greatest, exchanged, ored, anded, xored, places };
+  sycl::accessor<T> a;
+  SYCL_EXTERNAL void operator()(sycl::id<1> i) const {
+    relaxed_ref<T>(a[added]).fetch_add(2);
+    relaxed_ref<T>(a[added]).fetch_sub(1);
+    const T value = static_cast<T>(1 + i[0] * 7 % 65537);
+    relaxed_ref<T>(a[least]).fetch_min(value);
+    relaxed_ref<T>(a[greatest]).fetch_max(value);
+    const relaxed_ref<T> counter(a[exchanged]);
+    T seen = counter.load();
+    while (!counter.compare_exchange_weak(seen, static_cast<T>(seen + 1))) {
+    }
+    if constexpr (std::is_integral_v<T>) {
+      relaxed_ref<T>(a[ored]).fetch_or(static_cast<T>(1) << i[0] % 16);
+      relaxed_ref<T>(a[anded]).fetch_and(~(static_cast<T>(1) << i[0] % 15));
+      relaxed_ref<T>(a[xored]).fetch_xor(static_cast<T>(i[0]));
+    }
+  }
+};
 
 template <typename T>
 struct AtomicRef : testing::Test {};
@@ -69,6 +91,33 @@ TYPED_TEST(AtomicRef, MinAndMaxFindTheEndsUnderContention) {
     want = sycl::max(want, static_cast<T>(1 + k * 7 % 65537));
   }
   EXPECT_EQ(greatest, want);
+}
+
+TYPED_TEST(AtomicRef, ItemsOfAKernelLoseNothing) {
+  using T = TypeParam;
+  using at = contend<T>;
+  constexpr std::size_t items = 4094;
+  for (const sycl::device& device : sycl::device::get_devices()) {
+    sycl::queue q(device);
+    sycl::buffer<T> places{sycl::range<1>(at::places)};
+    {
+      const sycl::host_accessor a(places);
+      std::fill(a.begin(), a.end(), T(0));
+      a[at::least] = 1000000;
+      a[at::anded] = 0xFFFF;
+    }
+    q.submit([&](sycl::handler& h) { h.parallel_for(items, contend<T>{{places, h}}); });
+    const sycl::host_accessor a(places, sycl::read_only);
+    EXPECT_EQ(a[at::added], T(items));
+    EXPECT_EQ(a[at::least], T(1));
+    EXPECT_EQ(a[at::greatest], T(1 + (items - 1) * 7));
+    EXPECT_EQ(a[at::exchanged], T(items));
+    if constexpr (std::is_integral_v<T>) {
+      EXPECT_EQ(a[at::ored], T(0xFFFF));
+      EXPECT_EQ(a[at::anded], T(0x8000));
+      EXPECT_EQ(a[at::xored], T(1));  // 0 ^ 1 ^ ... ^ n is 1 where n % 4 is 1
+    }
+  }
 }
 
 TYPED_TEST(AtomicRef, EachOperationAlone) {
@@ -152,6 +201,8 @@ TEST(AtomicRef, DefaultOrdersFollowTheStandard) {
   static_assert(ref::default_scope == sycl::memory_scope::work_group);
   static_assert(!std::is_copy_assignable_v<ref>);
 }
+
+LUMEN_REPORTS_CUDA(AtomicRef)
 
 TEST(FunctionObjects, TypedAndTransparent) {
   EXPECT_EQ(sycl::plus<int>()(2, 3), 5);

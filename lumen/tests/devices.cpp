@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The devices of a process with two virtual ones, selectors, queries, contexts, and the parser
+// The devices of a process with three virtual ones, selectors, queries, contexts, and the parser
 // of LUMEN_VIRTUAL_DEVICES.
+#include <cstddef>
 #include <unordered_set>
 
 #include "every_device.hpp"
@@ -8,17 +9,32 @@
 
 using sycl::detail::parse_virtual_devices;
 
+namespace {
+// Real GPUs come after the devices that this suite sets up.
+std::ptrdiff_t gpus_of(sycl::backend kind) {
+  const std::vector<sycl::device> gpus = sycl::device::get_devices(sycl::info::device_type::gpu);
+  return std::count_if(gpus.begin(), gpus.end(), [kind](const sycl::device& gpu) {
+    return gpu.get_backend() == kind && gpu.get_platform().get_backend() == kind;
+  });
+}
+}  // namespace
+
 TEST(devices, host_comes_first_and_virtual_ones_in_their_order) {
   const std::vector<sycl::device> devices = sycl::device::get_devices();
-  ASSERT_EQ(devices.size(), 3U);
+  ASSERT_EQ(host_run_devices(), (std::vector<std::size_t>{0, 1, 2, 3}));
   EXPECT_TRUE(devices[0].is_cpu());
   EXPECT_TRUE(devices[1].is_gpu());
   EXPECT_TRUE(devices[2].is_accelerator());
+  EXPECT_TRUE(devices[3].is_gpu());
+  for (std::size_t i = 0; i < 4; ++i) {
+    EXPECT_EQ(has_own_memory(devices[i]), i == 3);
+  }
   EXPECT_EQ(devices[1].get_info<sycl::info::device::max_compute_units>(), 8U);
   EXPECT_EQ(devices[1].get_info<sycl::info::device::max_work_group_size>(), 256U);
   EXPECT_EQ(devices[2].get_info<sycl::info::device::max_work_group_size>(), 1024U);
-  EXPECT_EQ(sycl::device::get_devices(sycl::info::device_type::gpu).size(), 1U);
-  EXPECT_EQ(sycl::platform::get_platforms().size(), 2U);
+  EXPECT_EQ(gpus_of(sycl::backend::host), 2);
+  EXPECT_EQ(gpus_of(sycl::backend::cuda), static_cast<std::ptrdiff_t>(devices.size()) - 4);
+  EXPECT_EQ(sycl::platform::get_platforms().size(), devices.size() == 4 ? 2U : 3U);
 }
 
 TEST(devices, default_is_the_host_and_selectors_find_the_others) {
@@ -85,7 +101,8 @@ TEST_P(device_queries, answers_are_consistent) {
   EXPECT_EQ(d.get_info<info::aspects>().empty(), false);
   EXPECT_EQ(d.has(sycl::aspect::cpu) + d.has(sycl::aspect::gpu) + d.has(sycl::aspect::accelerator),
             1);
-  EXPECT_EQ(d.has(sycl::aspect::emulated), !d.is_cpu());
+  const bool host_run = d.get_backend() == sycl::backend::host;
+  EXPECT_EQ(d.has(sycl::aspect::emulated), host_run && !d.is_cpu());
   EXPECT_TRUE(d.has(sycl::aspect::fp64));
   EXPECT_FALSE(d.has(sycl::aspect::fp16));
   EXPECT_EQ(d.get_info<info::device_type>() == sycl::info::device_type::cpu, d.is_cpu());
@@ -105,6 +122,14 @@ TEST(virtual_devices, well_formed_lists_are_read) {
   EXPECT_EQ(two.devices[0].max_work_group_size, 128U);
   EXPECT_FALSE(two.devices[1].is_gpu);
   EXPECT_EQ(two.devices[1].compute_units, 0U);
+  EXPECT_FALSE(two.devices[0].own_memory);
+  EXPECT_FALSE(two.devices[1].own_memory);
+  const auto own = parse_virtual_devices("accelerator;gpu,memory=own,compute_units=3");
+  EXPECT_EQ(own.error, "");
+  ASSERT_EQ(own.devices.size(), 2U);
+  EXPECT_FALSE(own.devices[0].own_memory);
+  EXPECT_TRUE(own.devices[1].own_memory);
+  EXPECT_EQ(own.devices[1].compute_units, 3U);
 }
 
 TEST(virtual_devices, malformed_lists_name_their_column_and_give_nothing) {
@@ -131,6 +156,11 @@ TEST(virtual_devices, malformed_lists_name_their_column_and_give_nothing) {
       {"gpu,compute_units=99999999999999999999", 19},
       {"gpu,max_work_group_size=4097", 25},
       {"gpu,compute_units=2,compute_units=3", 21},
+      {"gpu,memory", 11},
+      {"gpu,memory=", 12},
+      {"gpu,memory=shared", 12},
+      {"gpu,memory=own ", 12},
+      {"gpu,memory=own,memory=own", 16},
   };
   for (const row& r : rows) {
     const auto parsed = parse_virtual_devices(r.text);

@@ -11,13 +11,6 @@
 
 #include "every_device.hpp"
 
-namespace {
-void sleep_until(const std::atomic<bool>& flag) {
-  while (!flag) {
-    std::this_thread::sleep_for(std::chrono::milliseconds(1));
-  }
-}
-
 // An output iterator that other threads may watch.
 struct assign_atomic {
   using iterator_category = std::output_iterator_tag;
@@ -32,6 +25,35 @@ struct assign_atomic {
   assign_atomic& operator=(int value) {
     *place = value;
     return *this;
+  }
+};
+
+namespace {
+void sleep_until(const std::atomic<bool>& flag) {
+  while (!flag) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(1));
+  }
+}
+
+struct store_and_count {
+  sycl::accessor<unsigned, 1, sycl::access_mode::write> a;
+  unsigned* total;
+  SYCL_EXTERNAL void operator()(sycl::id<1> i) const {
+    a[i] = 3;
+    sycl::atomic_ref<unsigned, sycl::memory_order::relaxed, sycl::memory_scope::device,
+                     sycl::access::address_space::global_space>(*total) += a[i];
+  }
+};
+
+struct add_one {
+  sycl::accessor<int> a;
+  SYCL_EXTERNAL void operator()() const { a[0] += 1; }
+};
+
+struct add_group_size {
+  int* sums;
+  SYCL_EXTERNAL void operator()(sycl::nd_item<1> i) const {
+    sums[i.get_global_id(0)] += sycl::reduce_over_group(i.get_group(), 1, sycl::plus<int>());
   }
 };
 }  // namespace
@@ -97,26 +119,23 @@ TEST(buffer_life, a_closure_with_the_last_copy_does_not_wait_for_later_users) {
   EXPECT_EQ(written, 10);
 }
 
-TEST(buffer_life, memory_outlives_a_buffer_that_dies_in_its_command_group_function) {
-  sycl::queue q;
-  std::atomic<std::size_t> sum{0};
-  std::atomic<std::size_t>* total = &sum;
+class buffer_lives : public on_every_device {};
+
+TEST_P(buffer_lives, memory_outlives_a_buffer_that_dies_in_its_command_group_function) {
+  sycl::queue q(device());
+  const shared_array<unsigned> total(1, q);
   for (int i = 0; i < 20; ++i) {
     q.submit([&](sycl::handler& h) {
-      sycl::buffer<int> b(sycl::range<1>(1000));
-      sycl::accessor a(b, h, sycl::write_only);
-      h.parallel_for(1000, [=](sycl::id<1> item) {
-        a[item] = 3;
-        *total += static_cast<std::size_t>(a[item]);
-      });
+      sycl::buffer<unsigned> b(sycl::range<1>(1000));
+      h.parallel_for(1000, store_and_count{{b, h}, total.data()});
     });
   }
   q.wait();
-  EXPECT_EQ(sum, 60000U);
+  EXPECT_EQ(total[0], 60000U);
 }
 
-TEST(buffer_life, a_throwing_command_group_leaves_its_buffers_free) {
-  sycl::queue q;
+TEST_P(buffer_lives, a_throwing_command_group_leaves_its_buffers_free) {
+  sycl::queue q(device());
   sycl::buffer<int> b(sycl::range<1>(1));
   EXPECT_THROW(q.submit([&](sycl::handler& h) {
     sycl::accessor a(b, h, sycl::write_only);
@@ -124,12 +143,11 @@ TEST(buffer_life, a_throwing_command_group_leaves_its_buffers_free) {
   }),
                std::runtime_error);
   b.get_host_access()[0] = 4;
-  q.submit([&](sycl::handler& h) {
-    sycl::accessor a(b, h, sycl::read_write);
-    h.single_task([=] { a[0] += 1; });
-  });
+  q.submit([&](sycl::handler& h) { h.single_task(add_one{{b, h}}); });
   EXPECT_EQ(b.get_host_access()[0], 5);
 }
+LUMEN_ON_EVERY_DEVICE(buffer_lives);
+LUMEN_REPORTS_CUDA(life)
 
 TEST(sizes, that_cannot_be_counted_are_refused) {
   constexpr std::size_t most = ~std::size_t{0};
@@ -145,7 +163,7 @@ TEST(sizes, that_cannot_be_counted_are_refused) {
     return code_of([&] {
       q.submit([&](sycl::handler& h) {
         make(h);
-        h.parallel_for(sycl::nd_range<1>(1, 1), [](sycl::nd_item<1>) {});
+        h.parallel_for(sycl::nd_range<1>(1, 1), nothing());
       });
     });
   };
@@ -175,15 +193,15 @@ TEST(process_exit_deathtest, a_task_may_end_the_process) {
   EXPECT_EXIT(leave(), testing::ExitedWithCode(7), "");
 }
 
-TEST(process_exit_deathtest, group_kernels_still_run_while_the_process_ends) {
+class device_exit_deathtest : public on_every_device {};
+
+TEST_P(device_exit_deathtest, group_kernels_still_run_while_the_process_ends) {
   testing::FLAGS_gtest_death_test_style = "threadsafe";
-  const auto leave = [] {
-    static sycl::queue q{sycl::property::queue::in_order()};
-    static int sums[64];
-    const auto kernel = [](sycl::nd_item<1> i) {
-      const int all = sycl::reduce_over_group(i.get_group(), 1, sycl::plus<int>());
-      sums[i.get_global_id(0)] += all;
-    };
+  const auto leave = [this] {
+    static sycl::queue q = in_order();
+    static int* const sums = sycl::malloc_shared<int>(64, q);
+    std::fill_n(sums, 64, 0);
+    const add_group_size kernel{sums};
     q.parallel_for(sycl::nd_range<1>(64, 64), kernel).wait();
     for (int i = 0; i < 200; ++i) {
       q.parallel_for(sycl::nd_range<1>(64, 64), kernel);
@@ -195,3 +213,4 @@ TEST(process_exit_deathtest, group_kernels_still_run_while_the_process_ends) {
   };
   EXPECT_EXIT(leave(), testing::ExitedWithCode(0), "the last sum is 12864");
 }
+LUMEN_ON_EVERY_DEVICE(device_exit_deathtest);

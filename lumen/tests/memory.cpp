@@ -12,14 +12,50 @@ std::vector<int> counting(std::size_t size) {
   std::iota(values.begin(), values.end(), 0);
   return values;
 }
+
+template <typename Accessor>
+struct add_hundred_to {
+  Accessor a;
+  template <typename Item>
+  SYCL_EXTERNAL void operator()(Item i) const {
+    a[i.get_id()] += 100;
+  }
+};
 // Adds 100 to every element by a kernel.
 template <typename Buffer>
 void add_hundred(sycl::queue q, Buffer& buffer) {
   q.submit([&](sycl::handler& h) {
-    sycl::accessor a(buffer, h, sycl::read_write);
-    h.parallel_for(buffer.get_range(), [=](auto i) { a[i.get_id()] += 100; });
+    h.parallel_for(buffer.get_range(),
+                   add_hundred_to<sycl::accessor<typename Buffer::value_type>>{{buffer, h}});
   });
 }
+
+using writer = sycl::accessor<int, 1, sycl::access_mode::write>;
+
+template <int Dimensions>
+struct store {
+  sycl::accessor<int, Dimensions, sycl::access_mode::write> to;
+  int value;
+  SYCL_EXTERNAL void operator()(sycl::id<Dimensions> i) const { to[i] = value; }
+};
+struct store_in_first {
+  writer to;
+  int value;
+  SYCL_EXTERNAL void operator()(sycl::id<1>) const { to[0] = value; }
+};
+template <typename Accessor>
+struct store_own_id {
+  Accessor to;
+  SYCL_EXTERNAL void operator()(sycl::id<1> i) const { to[i] = static_cast<int>(i); }
+};
+struct times_ten {
+  sycl::accessor<int> a;
+  SYCL_EXTERNAL void operator()() const { a[0] = a[0] * 10; }
+};
+struct add_own_id {
+  int* to;
+  SYCL_EXTERNAL void operator()(sycl::id<1> i) const { to[i] += static_cast<int>(i); }
+};
 }  // namespace
 
 static_assert(sycl::is_device_copyable_v<sycl::accessor<int, 2>>);
@@ -178,7 +214,7 @@ TEST_P(buffers, ranged_accessors_count_from_their_offset) {
   });
   q.submit([&](sycl::handler& h) {
     sycl::accessor part(b, h, sycl::range<2>(2, 3), sycl::id<2>(4, 5), sycl::write_only);
-    h.parallel_for(part.get_range(), [=](sycl::id<2> i) { part[i] = 7; });
+    h.parallel_for(part.get_range(), store<2>{part, 7});
   });
   const sycl::host_accessor a(b, sycl::read_only);
   int sum = 0;
@@ -193,20 +229,36 @@ TEST_P(buffers, ranged_accessors_count_from_their_offset) {
             sycl::errc::invalid);
 }
 
-TEST_P(buffers, placeholders_wait_for_require) {
+// A device with memory of its own would have to look into the kernel for the accessor's place.
+TEST_P(buffers, placeholders_wait_for_require_in_kernels_on_shared_memory) {
   sycl::queue q(device());
   sycl::buffer<int> b(sycl::range<1>(100));
-  sycl::accessor a(b, sycl::write_only);
+  const sycl::accessor a(b, sycl::write_only);
   EXPECT_TRUE(a.is_placeholder());
-  q.submit([&](sycl::handler& h) {
-    h.require(a);
-    h.parallel_for(b.get_range(), [=](sycl::id<1> i) { a[i] = static_cast<int>(i); });
-  });
+  const bool own = has_own_memory(device());
+  EXPECT_EQ(code_of([&] {
+              q.submit([&](sycl::handler& h) {
+                h.require(a);
+                h.parallel_for(b.get_range(), store_own_id<decltype(a)>{a});
+              });
+            }),
+            own ? sycl::errc::feature_not_supported : sycl::errc::success);
+  if (own) {
+    q.submit([&](sycl::handler& h) {
+      h.parallel_for(b.get_range(), store_own_id<writer>{{b, h}});
+    });
+  }
   EXPECT_EQ(b.get_host_access(sycl::read_only)[99], 99);
+}
+
+TEST_P(buffers, commands_take_placeholders) {
+  sycl::queue q(device());
+  sycl::buffer<int> b(sycl::range<1>(100));
+  q.submit([&](sycl::handler& h) { h.parallel_for(b.get_range(), store_own_id<writer>{{b, h}}); });
   std::vector<int> copy(100);
   q.copy(sycl::accessor(b, sycl::read_only), copy.data()).wait();
   EXPECT_EQ(copy, counting(100));
-  q.fill(a, 3);
+  q.fill(sycl::accessor(b, sycl::write_only), 3);
   EXPECT_EQ(b.get_host_access(sycl::read_only)[50], 3);
 }
 
@@ -214,18 +266,12 @@ TEST_P(buffers, host_tasks_see_what_kernels_wrote) {
   sycl::queue q(device());
   sycl::buffer<int> b(sycl::range<1>(1000));
   int sum = 0;
-  q.submit([&](sycl::handler& h) {
-    sycl::accessor a(b, h, sycl::write_only);
-    h.parallel_for(b.get_range(), [=](sycl::id<1>) { a[0] = 0; });
-  });
-  q.submit([&](sycl::handler& h) {
-    sycl::accessor a(b, h, sycl::write_only);
-    h.parallel_for(b.get_range(), [=](sycl::id<1> i) { a[i] = 2; });
-  });
+  q.submit([&](sycl::handler& h) { h.parallel_for(b.get_range(), store_in_first{{b, h}, 0}); });
+  q.submit([&](sycl::handler& h) { h.parallel_for(b.get_range(), store<1>{{b, h}, 2}); });
   q.submit([&](sycl::handler& h) {
      sycl::accessor a(b, h, sycl::read_only_host_task);
-     h.host_task([&sum, a](const sycl::interop_handle& interop) {
-       EXPECT_EQ(interop.get_backend(), sycl::backend::host);
+     h.host_task([&sum, &q, a](const sycl::interop_handle& interop) {
+       EXPECT_EQ(interop.get_backend(), q.get_backend());
        sum = std::accumulate(a.begin(), a.end(), 0);
      });
    }).wait();
@@ -239,10 +285,7 @@ TEST_P(buffers, a_host_accessor_keeps_kernels_out) {
   {
     sycl::host_accessor held(b);
     held[0] = 1;
-    e = q.submit([&](sycl::handler& h) {
-      sycl::accessor a(b, h, sycl::read_write);
-      h.single_task([=] { a[0] = a[0] * 10; });
-    });
+    e = q.submit([&](sycl::handler& h) { h.single_task(times_ten{{b, h}}); });
     std::this_thread::sleep_for(std::chrono::milliseconds(5));
     EXPECT_EQ(e.get_info<sycl::info::event::command_execution_status>(),
               sycl::info::event_command_status::submitted);
@@ -329,12 +372,13 @@ TEST_P(shared_memory, the_allocator_serves_containers) {
   using allocator = sycl::usm_allocator<int, sycl::usm::alloc::shared>;
   std::vector<int, allocator> values(100, 5, allocator(q));
   int* p = values.data();
-  q.parallel_for(100, [=](sycl::id<1> i) { p[i] += static_cast<int>(i); }).wait();
+  q.parallel_for(100, add_own_id{p}).wait();
   EXPECT_EQ(values[99], 104);
   EXPECT_EQ(sycl::get_pointer_type(p, q.get_context()), sycl::usm::alloc::shared);
   EXPECT_EQ(allocator(q), allocator(q));
 }
 LUMEN_ON_EVERY_DEVICE(shared_memory);
+LUMEN_REPORTS_CUDA(memory)
 
 TEST(multi_ptr, converts_and_counts) {
   int values[4] = {1, 2, 3, 4};

@@ -26,7 +26,8 @@ compound_result chi_square_by_folding(const compound_call<Engine, Out>& call, st
                                       sycl::event (*post_process)(sycl::queue&, std::int64_t,
                                                                   std::int32_t, const T*, Out)) {
   const std::int64_t count = values_of(call.n, each);
-  call_memory<T> scratch(call.queue, static_cast<std::size_t>(count), call.engine_name);
+  call_memory<T, sycl::usm::alloc::device> scratch(call.queue, static_cast<std::size_t>(count),
+                                                   call.engine_name);
   scratch.last_kernel = call.draw(distribution, count, scratch.array.get());
   scratch.last_kernel.wait_and_throw();
   scratch.last_kernel = post_process(call.queue, call.n, each, scratch.array.get(), call.out);

@@ -47,19 +47,20 @@ struct uniform_std {
   real_range<R> range() const { return {a, b}; }
 
   SYCL_EXTERNAL sycl::vec<T, results> operator()(const sycl::vec<R, 4>& x) const {
-    sycl::vec<T, results> out;
-    for (int i = 0; i < results; ++i) {
-      out[i] = result(x[i]);
-    }
-    return out;
-  }
-
- private:
-  SYCL_EXTERNAL T result(R x) const {
     if constexpr (std::is_integral_v<T>) {
-      return floor_to_integer<T>(x);
+      sycl::vec<T, results> out;
+      for (int i = 0; i < results; ++i) {
+        out[i] = floor_to_integer<T>(x[i]);
+      }
+      return out;
     } else {
-      return accurate != 0 ? sycl::fmin(sycl::fmax(x, a), b) : x;
+      sycl::vec<T, results> out = x;
+      if (accurate != 0) {  // asked once for all four: work-items of a call answer alike
+        for (int i = 0; i < results; ++i) {
+          out[i] = sycl::fmin(sycl::fmax(x[i], a), b);
+        }
+      }
+      return out;
     }
   }
 };

@@ -38,17 +38,15 @@ struct engine_func<mrg32k3a, T, R, Functor, Out> {
   std::uint64_t n;
 
   SYCL_EXTERNAL void operator()(sycl::nd_item<1> item) const {
-    const std::uint64_t values = static_cast<std::uint64_t>(vec_size);
-    const std::uint64_t blocks = mrg32k3a_per_item(n) / values;  // of four words
-    const std::uint64_t first = item.get_global_linear_id() * blocks;
+    const std::uint64_t first = item.get_global_linear_id() * mrg32k3a_per_item(n);
+    const std::uint64_t end = first + mrg32k3a_per_item(n);
     tag_rvx_sycl_brng_mrg32k3a_stream_t position = state;
-    mrg32k3a_skip(&position, static_cast<std::int64_t>(4 * first));
-    for (std::uint64_t block = first; block < first + blocks; ++block) {
+    mrg32k3a_skip(&position, static_cast<std::int64_t>(first * gpu::words_per_result<Functor>));
+    for (std::uint64_t base = first; base < end; base += static_cast<std::uint64_t>(vec_size)) {
       sycl::vec<R, 4> words;
       for (int i = 0; i < 4; ++i) {
         words[i] = unsigned_word(mrg32k3a_step(&position), rule);
       }
-      const std::uint64_t base = block * values;
       store_values<T, Functor::results>(r, base, n, results_of<T>(functor, words, base));
     }
   }

@@ -136,8 +136,9 @@ SYCL_EXTERNAL void philox4x32x10_generate(tag_rvx_sycl_brng_philox4x32x10_stream
   for (int i = 0; i < 4; ++i) {
     words[4 + i] = state->ctr[i];
   }
-  for (std::uint32_t i = 0; i < 4; ++i) {
-    out[static_cast<int>(i)] = philox4x32x10_convert(words[4 - idx + i], a, b);
+  for (int i = 0; i < 4; ++i) {  // words[4 - idx + i]; places that are known stay in registers
+    const std::uint32_t word = idx == 1 ? words[3 + i] : idx == 2 ? words[2 + i] : words[1 + i];
+    out[i] = philox4x32x10_convert(word, a, b);
   }
 }
 

@@ -73,11 +73,23 @@ struct engine_func<sobol, T, R, Functor, Out> {
       }
       const sycl::vec<T, 4> values =
           results_of<T>(functor, words, static_cast<std::uint64_t>(place), walk.dimensions);
-      for (int i = 0; i < 4; ++i) {
-        if (place >= 0 && place < end) {
-          r[static_cast<std::size_t>(place)] = values[i];
-        }
-        place += walk.dimensions;
+      store_points(place, values);
+      place += 4 * std::int64_t{walk.dimensions};
+    }
+  }
+
+ private:
+  /// Stores the results of four points that follow one another, the first at `place`; those of
+  /// other calls are dropped.
+  SYCL_EXTERNAL void store_points(std::int64_t place, const sycl::vec<T, 4>& values) const {
+    if (walk.dimensions == 1) {  // neighbours, and no point is ever in progress
+      store_values(r, static_cast<std::uint64_t>(place), walk.n, values);
+      return;
+    }
+    const std::int64_t end = static_cast<std::int64_t>(walk.n);
+    for (int i = 0; i < 4; ++i, place += walk.dimensions) {
+      if (place >= 0 && place < end) {
+        r[static_cast<std::size_t>(place)] = values[i];
       }
     }
   }

@@ -212,9 +212,7 @@ struct engine_func_mt {
   }
 
   SYCL_EXTERNAL void store_one(std::uint64_t index, R value) const {
-    T out[1];
-    results_of_some<T>(functor, &value, index, out);
-    r[index] = out[0];
+    r[index] = results_of_some<T>(functor, &value, index)[0];
   }
 
   /// The results of pair (or four) number `pair` of the call, which stands in the slots from
@@ -225,11 +223,8 @@ struct engine_func_mt {
     for (std::uint32_t i = 0; i < together; ++i) {
       values[i] = slots.values[together * number + i];
     }
-    T out[results];
-    results_of_some<T>(functor, values, pair * results, out);
-    for (std::uint64_t i = 0; i < results && pair * results + i < n; ++i) {
-      r[pair * results + i] = out[i];
-    }
+    const std::uint64_t first = pair * results;
+    store_values(r, first, n, results_of_some<T>(functor, values, first));
   }
 
   static constexpr std::uint32_t together = gpu::values_together<Functor>;

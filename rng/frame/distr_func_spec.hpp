@@ -34,13 +34,7 @@ struct distr_func_spec {
     for (int i = 0; i < together; ++i) {
       values[i] = unsigned_word(words[g * together + static_cast<std::uint64_t>(i)], rule);
     }
-    T out[made];
-    results_of_some<T>(functor, values, g * made, out);
-    sycl::vec<T, made> results;
-    for (int i = 0; i < made; ++i) {
-      results[i] = out[i];
-    }
-    store_values(r, g * made, n, results);
+    store_values(r, g * made, n, results_of_some<T>(functor, values, g * made));
   }
 };
 

@@ -12,17 +12,41 @@
 
 namespace kestrel::tarn::rng::detail {
 
+/// Stores neighbouring results by 16 bytes at once, which is what a GPU writes in one instruction,
+/// or by all of them where they are fewer bytes. An output may begin at any element: where it is
+/// not aligned for that, which is the same for all work-items of a call, each goes out by itself. A
+/// vec lies in memory as its elements do, one behind the other (SYCL 2020, section 4.14.2.6).
+template <typename T, int size>
+SYCL_EXTERNAL void store_neighbours(T* to, const sycl::vec<T, size>& values) {
+  constexpr int at_once = 16 / static_cast<int>(sizeof(T));
+  constexpr int width = size < at_once ? size : at_once;
+  using part = sycl::vec<T, width>;
+  if (reinterpret_cast<std::uintptr_t>(to) % alignof(part) == 0) {
+    for (int j = 0; j < size; j += width) {
+      part together;
+      for (int k = 0; k < width; ++k) {
+        together[k] = values[j + k];
+      }
+      *reinterpret_cast<part*>(to + j) = together;
+    }
+  } else {
+    for (int j = 0; j < size; ++j) {
+      to[j] = values[j];
+    }
+  }
+}
+
 /// Stores a work-item's values from `base` on: all of them, or those below `n`.
 template <typename T, int size, typename Out>
 SYCL_EXTERNAL void store_values(const Out& r, std::uint64_t base, std::uint64_t n,
                                 const sycl::vec<T, size>& values) {
   if (base + static_cast<std::uint64_t>(size) <= n) {
-    for (int j = 0; j < size; ++j) {
-      r[base + static_cast<std::uint64_t>(j)] = values[j];
-    }
+    store_neighbours(&r[base], values);
   } else {
-    for (int j = 0; base + static_cast<std::uint64_t>(j) < n; ++j) {
-      r[base + static_cast<std::uint64_t>(j)] = values[j];
+    for (int j = 0; j < size; ++j) {  // a fixed count keeps the values in registers
+      if (base + static_cast<std::uint64_t>(j) < n) {
+        r[base + static_cast<std::uint64_t>(j)] = values[j];
+      }
     }
   }
 }
@@ -48,8 +72,11 @@ SYCL_EXTERNAL sycl::vec<T, Functor::results> results_of(const Functor& functor,
 /// The results of as many values as the functor has to be given together, the first of which stands
 /// at place `first`.
 template <typename T, typename R, typename Functor>
-SYCL_EXTERNAL void results_of_some(const Functor& functor, const R* values, std::uint64_t first,
-                                   T* out) {
+SYCL_EXTERNAL sycl::vec<T, gpu::results_together<Functor>> results_of_some(const Functor& functor,
+                                                                           const R* values,
+                                                                           std::uint64_t first) {
+  constexpr int together = gpu::values_together<Functor>;
+  T out[gpu::results_together<Functor>];
   if constexpr (gpu::has_one<Functor>) {
     out[0] = functor.one(values[0]);
   } else if constexpr (gpu::has_pair<Functor>) {
@@ -58,13 +85,18 @@ SYCL_EXTERNAL void results_of_some(const Functor& functor, const R* values, std:
     // What makes four results makes more than are asked for.
     sycl::vec<R, 4> four;
     for (int i = 0; i < 4; ++i) {
-      four[i] = values[i % gpu::values_together<Functor>];
+      four[i] = values[i % together];
     }
     const sycl::vec<T, Functor::results> results = results_of<T>(functor, four, first, 0);
     for (int i = 0; i < gpu::results_together<Functor>; ++i) {
       out[i] = results[i];
     }
   }
+  sycl::vec<T, gpu::results_together<Functor>> results;
+  for (int i = 0; i < gpu::results_together<Functor>; ++i) {
+    results[i] = out[i];
+  }
+  return results;
 }
 
 /// T is the result type, R the type that the engine delivers (real or word), Out a pointer or a

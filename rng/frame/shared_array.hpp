@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Memory that host and device share: the device images of engines, and what lives for one call.
+// Memory for kernels: what host and device share, such as the device images of engines, what lives
+// for one call, and what no host code ever looks at, which stays in the device's own memory.
 #pragma once
 
 #include <cstddef>
@@ -10,26 +11,26 @@
 
 namespace kestrel::tarn::rng::detail {
 
-/// `size` elements in shared memory of a queue's device and context, not initialised. Whoever owns
-/// the array sees to it that no kernel uses it any more when it goes.
-template <typename T>
-class shared_array {
+/// `size` elements in memory of a queue's device and context, not initialised. Whoever owns the
+/// array sees to it that no kernel uses it any more when it goes.
+template <typename T, sycl::usm::alloc kind>
+class usm_array {
  public:
   /// Raises device_bad_alloc in the name of `engine`.
-  shared_array(const sycl::queue& queue, std::size_t size, const char* engine)
+  usm_array(const sycl::queue& queue, std::size_t size, const char* engine)
       : context_(queue.get_context()),
         size_(size),
-        data_(sycl::aligned_alloc_shared<T>(alignof(T), size, queue)) {
+        data_(sycl::aligned_alloc<T>(alignof(T), size, queue, kind)) {
     if (data_ == nullptr) {
       throw device_bad_alloc("rng", engine, queue.get_device());
     }
   }
-  shared_array(shared_array&& other) noexcept
+  usm_array(usm_array&& other) noexcept
       : context_(std::move(other.context_)),
         size_(std::exchange(other.size_, 0)),
         data_(std::exchange(other.data_, nullptr)) {}
-  shared_array& operator=(shared_array&&) = delete;
-  ~shared_array() {
+  usm_array& operator=(usm_array&&) = delete;
+  ~usm_array() {
     if (data_ != nullptr) {
       sycl::free(data_, context_);
     }
@@ -45,9 +46,12 @@ class shared_array {
   T* data_;
 };
 
+template <typename T>
+using shared_array = usm_array<T, sycl::usm::alloc::shared>;
+
 /// Memory of one call. It goes when the last kernel has run: whoever drops it waits for that one,
 /// so that no kernel loses it when something is raised.
-template <typename T>
+template <typename T, sycl::usm::alloc kind = sycl::usm::alloc::shared>
 struct call_memory {
   /// Raises device_bad_alloc in the name of `engine`. For no elements there is room for one, as
   /// memory of no bytes cannot be had.
@@ -57,7 +61,7 @@ struct call_memory {
   call_memory& operator=(const call_memory&) = delete;
   ~call_memory() { last_kernel.wait(); }
 
-  shared_array<T> array;
+  usm_array<T, kind> array;
   sycl::event last_kernel;
 };
 

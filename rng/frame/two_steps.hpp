@@ -15,7 +15,7 @@
 namespace kestrel::tarn::rng::detail {
 
 /// The words between the two kernels.
-using drawn_words = call_memory<std::uint32_t>;
+using drawn_words = call_memory<std::uint32_t, sycl::usm::alloc::device>;
 
 /// Submits the second kernel behind the first, `words->last_kernel`, and behind it a task of the
 /// host that lets go of the words, so that the caller need not wait. Returns the event of the

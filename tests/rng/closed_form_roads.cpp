@@ -194,6 +194,7 @@ struct closed_form_roads : testing::Test {};
 using engines = testing::Types<rng::philox4x32x10, rng::mcg31m1, rng::mcg59, rng::mrg32k3a,
                                rng::mt19937, rng::mt2203, rng::sobol>;
 TYPED_TEST_SUITE(closed_form_roads, engines);
+TARN_REPORTS_CUDA(closed_form_roads)
 
 TYPED_TEST(closed_form_roads, agree) {
   using namespace rng;

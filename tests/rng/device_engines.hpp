@@ -1,11 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// The engines on GPUs whose state travels by value, as types for suites, and the GPUs that suites
-// over them walk.
+// The engines on GPUs whose state travels by value, as types for suites.
 #pragma once
 
 #include <string>
 #include <tuple>
-#include <vector>
 
 #include <kestrel/tarn/rng.hpp>
 #include <sycl/sycl.hpp>
@@ -29,13 +27,5 @@ struct engine_name {
     return kestrel::tarn::rng::detail::engine_row<Engine>::name;
   }
 };
-
-inline std::vector<sycl::queue> gpu_queues() {
-  std::vector<sycl::queue> queues;
-  for (const sycl::device& device : sycl::device::get_devices(sycl::info::device_type::gpu)) {
-    queues.emplace_back(device);
-  }
-  return queues;
-}
 
 }  // namespace tarn_test

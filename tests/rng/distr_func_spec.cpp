@@ -39,9 +39,8 @@ auto functor_of(const Distr& distr) {
 
 /// n results through pointers, with guards behind them.
 template <typename T, typename Functor>
-std::vector<T> through_pointers(const Functor& functor, const std::vector<std::uint32_t>& drawn,
-                                std::int64_t n) {
-  sycl::queue queue = tarn_test::gpu_queue();
+std::vector<T> through_pointers(sycl::queue queue, const Functor& functor,
+                                const std::vector<std::uint32_t>& drawn, std::int64_t n) {
   const auto count = static_cast<std::size_t>(n);
   auto* words = sycl::malloc_shared<std::uint32_t>(drawn.size(), queue);
   T* results = sycl::malloc_shared<T>(count + guard_size, queue);
@@ -64,9 +63,8 @@ std::vector<T> through_pointers(const Functor& functor, const std::vector<std::u
 
 /// The same from a buffer into a buffer.
 template <typename T, typename Functor>
-std::vector<T> through_buffers(const Functor& functor, std::vector<std::uint32_t> drawn,
-                               std::int64_t n) {
-  sycl::queue queue = tarn_test::gpu_queue();
+std::vector<T> through_buffers(sycl::queue queue, const Functor& functor,
+                               std::vector<std::uint32_t> drawn, std::int64_t n) {
   std::vector<T> values(static_cast<std::size_t>(n) + guard_size, marker<T>());
   {
     sycl::buffer<std::uint32_t, 1> words(drawn.data(), sycl::range<1>(drawn.size()));
@@ -99,8 +97,11 @@ void expect_functor_on_each_pair(const Distr& distr) {
       expected.insert(expected.end(), values, values + step);
     }
     expected.resize(static_cast<std::size_t>(n));
-    ASSERT_EQ((through_pointers<T>(functor, drawn, n)), expected) << n;
-    ASSERT_EQ((through_buffers<T>(functor, drawn, n)), expected) << n;
+    for (const sycl::queue& queue : tarn_test::gpu_queues()) {
+      const auto results = through_pointers<T>(queue, functor, drawn, n);
+      ASSERT_TRUE(tarn_test::same_reals(queue, results, expected)) << n;
+      ASSERT_EQ(through_buffers<T>(queue, functor, drawn, n), results) << n;
+    }
   }
 }
 
@@ -112,16 +113,19 @@ void expect_host(const Distr& distr, const Steepness& steepness) {
   constexpr std::int64_t n = 20000;
   rng::mt19937 engine(tarn_test::cpu_queue(), seed);
   const auto host = tarn_test::draw(distr, engine, n);
-  const auto device = through_pointers<T>(functor_of(distr), words_of_mt19937(2 * n), n);
-  for (std::size_t i = 0; i < host.size(); ++i) {
-    ASSERT_NO_FATAL_FAILURE(
-        tarn_test::expect_within<T>(device[i], host[i], 4 * steepness(host[i]), host[i]))
-        << i;
+  for (const sycl::queue& queue : tarn_test::gpu_queues()) {
+    const auto device = through_pointers<T>(queue, functor_of(distr), words_of_mt19937(2 * n), n);
+    for (std::size_t i = 0; i < host.size(); ++i) {
+      ASSERT_NO_FATAL_FAILURE(
+          tarn_test::expect_within<T>(device[i], host[i], 4 * steepness(host[i]), host[i]))
+          << i;
+    }
   }
 }
 
 template <typename R>
 struct pairs_of_words : testing::Test {};
+TARN_REPORTS_CUDA(pairs_of_words)
 using real_types = testing::Types<float, double>;
 TYPED_TEST_SUITE(pairs_of_words, real_types);
 

@@ -4,15 +4,19 @@
 #pragma once
 
 #include <array>
+#include <cmath>
 #include <cstdint>
 #include <cstring>
 #include <initializer_list>
+#include <limits>
 #include <vector>
 
 #include <kestrel/tarn/rng.hpp>
 #include <sycl/sycl.hpp>
 
 #include <gtest/gtest.h>
+
+#include "queues.hpp"
 
 namespace tarn_test {
 
@@ -83,4 +87,40 @@ inline rng::philox4x32x10 philox_at(const sycl::queue& queue,
       queue, {pair(key[0], key[1]), pair(ctr[0], ctr[1]), pair(ctr[2], ctr[3]), 0, 0, 0});
 }
 
+/// Whether reals made of the same words are the same: bit for bit where the kernels of `queue` run
+/// on the host. The elementary functions of another device part from it by units in the last place,
+/// which closed_form_roads bounds; a word from another place would show in the first digits.
+template <typename T>
+bool same_reals(const sycl::queue& queue, const std::vector<T>& got, const std::vector<T>& want) {
+  if (!is_cuda(queue) || got.size() != want.size()) {
+    return got == want;
+  }
+  for (std::size_t i = 0; i < got.size(); ++i) {
+    const T bound = 100 * std::numeric_limits<T>::epsilon() * (10 + std::abs(want[i]));
+    if (!(std::abs(got[i] - want[i]) <= bound)) {
+      return false;
+    }
+  }
+  return true;
+}
+
+/// A short call on each CUDA device, which has to give the words of the host.
+inline void expect_words_on_cuda() {
+  rng::philox4x32x10 host(cpu_queue(), 7);
+  const auto expected = draw(rng::bits<>(), host, 1003);
+  for (const sycl::queue& queue : cuda_queues()) {
+    rng::philox4x32x10 engine(queue, 7);
+    EXPECT_EQ(draw(rng::bits<>(), engine, 1003), expected);
+  }
+}
+
 }  // namespace tarn_test
+
+/// A test that says in the report whether a suite ran on a CUDA device as well.
+#define TARN_REPORTS_CUDA(suite)             \
+  TEST(suite##_on_cuda, there_is_a_device) { \
+    if (tarn_test::cuda_queues().empty()) {  \
+      GTEST_SKIP() << "no CUDA device";      \
+    }                                        \
+    tarn_test::expect_words_on_cuda();       \
+  }

@@ -95,6 +95,7 @@ class engine_road : public testing::Test {
   }
 };
 TYPED_TEST_SUITE(engine_road, tarn_test::device_engines, tarn_test::engine_name);
+TARN_REPORTS_CUDA(engine_road)
 
 TYPED_TEST(engine_road, every_count_from_several_places) {
   constexpr std::int64_t most = 300;

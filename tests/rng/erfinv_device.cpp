@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // The inverse error function of kernels: bit for bit the cubics of the tables, whose segment is
 // found here by the exponent of t = 1 - |x|; the function itself within the error of the cubics;
-// the ends, zeros and what is no argument.
+// the ends, zeros and what is no argument; and the same bits on every device.
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <limits>
+#include <vector>
 
 #include <sycl/sycl.hpp>
 
@@ -12,6 +14,9 @@
 #include <gtest/gtest.h>
 
 #include "distributions/erfinv.hpp"
+#include "drawing.hpp"
+#include "in_flight.hpp"
+#include "queues.hpp"
 
 namespace {
 
@@ -147,6 +152,51 @@ TEST(erfinv_float, has_values_at_the_ends_and_at_zero) {
   EXPECT_TRUE(std::isnan(erfinv_wrapper(std::numeric_limits<float>::quiet_NaN())));
   EXPECT_EQ(erfinv_wrapper(std::numeric_limits<float>::infinity()),
             std::numeric_limits<float>::infinity());
+}
+
+template <typename Real>
+struct erfinv_of_each {
+  const Real* x;
+  Real* result;
+
+  SYCL_EXTERNAL void operator()(sycl::id<1> i) const { result[i] = erfinv_wrapper(x[i]); }
+};
+
+/// The function of each argument, as a kernel gives it.
+template <typename Real>
+void expect_same_on_a_device(sycl::queue queue, const std::vector<Real>& arguments) {
+  const std::size_t size = arguments.size();
+  const tarn_test::results<Real> x(queue, size);
+  const tarn_test::results<Real> result(queue, size);
+  std::copy(arguments.begin(), arguments.end(), x.get());
+  queue
+      .submit([&](sycl::handler& group) {
+        group.parallel_for(sycl::range<1>(size), erfinv_of_each<Real>{x.get(), result.get()});
+      })
+      .wait_and_throw();
+  for (std::size_t i = 0; i < size; ++i) {
+    ASSERT_TRUE(tarn_test::same_bits(result.get()[i], erfinv_wrapper(arguments[i])))
+        << result.get()[i] << " for " << arguments[i];
+  }
+}
+
+class erfinv_on_devices : public tarn_test::over_queues {};
+TARN_OVER_QUEUES(erfinv_on_devices);
+TARN_REPORTS_CUDA(erfinv_on_devices)
+
+TEST_P(erfinv_on_devices, has_the_same_bits) {
+  std::vector<float> floats = {0.0f, -0.0f, 1.0f, -1.0f};
+  for (std::uint32_t bits = 1; bits < 0x3F800000u; bits += 10007) {
+    floats.push_back(sycl::bit_cast<float>(bits));
+    floats.push_back(-floats.back());
+  }
+  expect_same_on_a_device(queue(), floats);
+  std::vector<double> doubles = {0.0, -0.0, 1.0, -1.0};
+  for (int i = 0; i < 100000; ++i) {
+    doubles.push_back(static_cast<double>(i) / 100000);
+    doubles.push_back(std::exp(-36.7 * i / 100000) - 1);
+  }
+  expect_same_on_a_device(queue(), doubles);
 }
 
 TEST(erfinv_double, has_values_at_the_ends_and_at_zero_and_none_beyond) {

@@ -31,6 +31,7 @@ const std::string bad_r = "kestrel::tarn::rng::generate: invalid argument: r";
 
 class frame : public tarn_test::over_queues {};
 TARN_OVER_QUEUES(frame);
+TARN_REPORTS_CUDA(frame)
 
 std::string pointer_refusal(rng::philox4x32x10& engine, std::int64_t n, float* r) {
   return message_of<tarn::invalid_argument>(

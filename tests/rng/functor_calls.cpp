@@ -107,6 +107,7 @@ void check_row(int& rows) {
 template <typename Engine>
 class functor_call : public testing::Test {};
 TYPED_TEST_SUITE(functor_call, tarn_test::device_engines, tarn_test::engine_name);
+TARN_REPORTS_CUDA(functor_call)
 
 TYPED_TEST(functor_call, takes_its_words_and_can_be_cut) {
   using namespace rng;

@@ -30,6 +30,7 @@ using tarn_test::cpu_queue;
 using tarn_test::draw;
 using tarn_test::gpu_queue;
 using tarn_test::gpu_queues;
+using tarn_test::same_reals;
 using words = std::vector<std::uint32_t>;
 
 constexpr std::uint32_t seed = 20211;
@@ -85,6 +86,8 @@ TEST(mt19937_plan, makes_a_remainder_of_one_round_as_a_tail) {
   EXPECT_EQ(plan(7168 + 224), (plan_type{1, 0, 224}));
   EXPECT_EQ(plan(7168 + 225), (plan_type{1, 1, 1}));
 }
+
+TARN_REPORTS_CUDA(mt19937_road)
 
 TEST(mt19937_road, has_the_words_of_the_host_at_every_bound_of_the_plan) {
   const auto queues = gpu_queues();
@@ -181,7 +184,8 @@ TEST(mt19937_pairs, of_two_results_follow_the_sequence) {
   for (const std::int64_t n : pair_counts) {
     SCOPED_TRACE(n);
     mt19937 engine(gpu_queue(), seed);
-    EXPECT_TRUE(draw(normal, engine, n) == pairs_of_host<double>(functor, 0, n));
+    EXPECT_TRUE(same_reals(engine.get_queue(), draw(normal, engine, n),
+                           pairs_of_host<double>(functor, 0, n)));
     // An odd count takes a word that is not counted.
     ASSERT_EQ(next(engine, 3), part(n, 3));
   }
@@ -193,7 +197,8 @@ TEST(mt19937_pairs, of_one_result_follow_the_sequence) {
   for (const std::int64_t n : pair_counts) {
     SCOPED_TRACE(n);
     mt19937 engine(gpu_queue(), seed);
-    EXPECT_TRUE(draw(normal, engine, n) == pairs_of_host<float>(functor, 0, n));
+    EXPECT_TRUE(same_reals(engine.get_queue(), draw(normal, engine, n),
+                           pairs_of_host<float>(functor, 0, n)));
     ASSERT_EQ(next(engine, 3), part(2 * n, 3));
   }
 }
@@ -217,7 +222,8 @@ TEST(mt19937_pairs, of_odd_calls_begin_where_the_count_says) {
   for (int call = 0; call < 20; ++call) {
     const auto n = static_cast<std::int64_t>(random() % 900) * 2 + 1;
     SCOPED_TRACE(std::to_string(n) + " from " + std::to_string(place));
-    ASSERT_TRUE(draw(normal, engine, n) == pairs_of_host<double>(functor, place, n));
+    ASSERT_TRUE(same_reals(engine.get_queue(), draw(normal, engine, n),
+                           pairs_of_host<double>(functor, place, n)));
     place += n;
   }
 }

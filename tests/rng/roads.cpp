@@ -52,6 +52,7 @@ rng::philox4x32x10 engine_at(const sycl::queue& queue, uint128 ctr, std::uint64_
 
 class philox_road : public tarn_test::over_queues {};
 TARN_OVER_QUEUES(philox_road);
+TARN_REPORTS_CUDA(philox_road)
 
 TEST_P(philox_road, every_count_from_every_place_in_a_block) {
   for (std::uint64_t first = 0; first < 4; ++first) {

@@ -155,12 +155,12 @@ std::string refusal(std::size_t bytes, const Call& call) {
 
 std::string no_memory() {
   return "kestrel::tarn::rng::sobol: cannot allocate memory on " +
-         gpu_queue().get_device().get_info<sycl::info::device::name>();
+         host_run_gpu_queue().get_device().get_info<sycl::info::device::name>();
 }
 
 TEST(sobol_without_memory, for_its_image_cannot_be_made_copied_or_loaded) {
   constexpr std::uint32_t dimensions = 1009;
-  const sycl::queue queue = gpu_queue();
+  const sycl::queue queue = host_run_gpu_queue();
   sobol source(queue, dimensions);
   draw(bits, source, 2000);
   const image saved = image_of(source);
@@ -181,11 +181,11 @@ TEST(sobol_without_memory, for_its_image_cannot_be_made_copied_or_loaded) {
 }
 
 TEST(sobol_without_memory, for_the_words_of_pairs_stays_where_it_is) {
-  sobol engine(gpu_queue(), 3);
+  sobol engine(host_run_gpu_queue(), 3);
   draw(bits, engine, 4);
   const image before = image_of(engine);
   constexpr std::size_t n = 1013;
-  results<double> out(gpu_queue(), n);
+  results<double> out(host_run_gpu_queue(), n);
   EXPECT_EQ(refusal(8 * n, [&] { rng::generate(pairs, engine, n, out.get()); }), no_memory());
   EXPECT_TRUE(out.untouched());
   EXPECT_EQ(image_of(engine), before);

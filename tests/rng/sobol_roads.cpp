@@ -25,10 +25,11 @@ using words = std::vector<std::uint32_t>;
 
 const std::uint32_t dimension_counts[] = {1, 2, 3, 39, 48, 49, 1111};
 
+TARN_REPORTS_CUDA(sobol_road)
+
 TEST(sobol_road, has_the_words_of_the_host_on_every_device) {
-  const auto queues = gpu_queues();
-  ASSERT_EQ(queues.size(), 3u);
-  for (const sycl::queue& queue : queues) {
+  ASSERT_EQ(tarn_test::host_run_gpu_queues().size(), 3u);
+  for (const sycl::queue& queue : gpu_queues()) {
     for (const std::uint32_t dimensions : dimension_counts) {
       sobol_pair both(dimensions, queue);
       for (const std::int64_t n : {1, 2, 5, 0, 1023, 4099}) {

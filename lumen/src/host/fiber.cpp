@@ -12,6 +12,7 @@
 
 #if defined(__SANITIZE_ADDRESS__)
 #define LUMEN_ASAN 1
+#include <sanitizer/asan_interface.h>
 #include <sanitizer/common_interface_defs.h>
 #else
 #define LUMEN_ASAN 0
@@ -112,6 +113,10 @@ fiber::fiber(void (*entry)(void*), void* argument, std::size_t colour)
 fiber::~fiber() {
 #if LUMEN_TSAN
   __tsan_destroy_fiber(point.thread_fiber);
+#endif
+#if LUMEN_ASAN
+  // Whoever maps these addresses next must not find what frames that never ended have poisoned.
+  __asan_unpoison_memory_region(mapping_, stack_bytes + page_bytes());
 #endif
   munmap(mapping_, stack_bytes + page_bytes());
 }

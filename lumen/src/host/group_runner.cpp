@@ -24,7 +24,7 @@ std::exception_ptr divergence() {
 }
 }  // namespace
 
-void group_wait(group_frame& frame) {
+void host_group_wait(group_frame& frame) {
   static_cast<group_runner&>(frame).wait_here();
 }
 

@@ -31,7 +31,7 @@ class group_runner : private group_frame {
            std::size_t end);
 
  private:
-  friend void group_wait(group_frame& frame);
+  friend void host_group_wait(group_frame& frame);
   struct worker {
     std::unique_ptr<fiber> stack;
     group_runner* runner;

@@ -3,6 +3,7 @@
 // of this runtime.
 #include "host_devices.hpp"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstring>
 #include <unistd.h>
@@ -150,9 +151,35 @@ device_properties virtual_properties(const device_properties& host,
     p.max_num_sub_groups = static_cast<std::uint32_t>(setting.max_work_group_size);
   }
   p.execution_capabilities = {info::execution_capability::exec_kernel};
+  p.host_unified_memory = !setting.own_memory;
   p.aspects[0] = setting.is_gpu ? aspect::gpu : aspect::accelerator;
   p.aspects.push_back(aspect::emulated);
+  if (setting.own_memory) {
+    const auto reaches_all_memory = [](aspect a) {
+      return a == aspect::usm_system_allocations || a == aspect::usm_atomic_host_allocations ||
+             a == aspect::usm_atomic_shared_allocations;
+    };
+    p.aspects.erase(std::remove_if(p.aspects.begin(), p.aspects.end(), reaches_all_memory),
+                    p.aspects.end());
+  }
   return p;
+}
+
+// Appends the virtual devices of one kind.
+void add_virtual_devices(std::vector<std::unique_ptr<device_record>>& devices,
+                         const device_properties& host, bool own_memory) {
+  static const platform_record& platform = *new platform_record{
+      backend::host, "lumen virtual devices", "lumen", runtime_version, "FULL_PROFILE", {}};
+  for (const virtual_device_setting& setting : virtual_devices_from_environment()) {
+    if (setting.own_memory == own_memory) {
+      auto record = std::make_unique<device_record>();
+      record->properties = virtual_properties(host, setting);
+      record->platform = &platform;
+      record->default_rating = setting.is_gpu ? 50 : 40;
+      record->detached = own_memory;
+      devices.push_back(std::move(record));
+    }
+  }
 }
 
 }  // namespace
@@ -160,21 +187,19 @@ device_properties virtual_properties(const device_properties& host,
 std::vector<std::unique_ptr<device_record>> host_devices() {
   static const platform_record& host_platform = *new platform_record{
       backend::host, "lumen host", "lumen", runtime_version, "FULL_PROFILE", {}};
-  static const platform_record& virtual_platform = *new platform_record{
-      backend::host, "lumen virtual devices", "lumen", runtime_version, "FULL_PROFILE", {}};
   std::vector<std::unique_ptr<device_record>> devices;
   devices.push_back(std::make_unique<device_record>());
   device_record& host = *devices.back();
   host.properties = host_properties();
   host.platform = &host_platform;
   host.default_rating = 100;
-  for (const virtual_device_setting& setting : virtual_devices_from_environment()) {
-    auto record = std::make_unique<device_record>();
-    record->properties = virtual_properties(host.properties, setting);
-    record->platform = &virtual_platform;
-    record->default_rating = setting.is_gpu ? 50 : 40;
-    devices.push_back(std::move(record));
-  }
+  add_virtual_devices(devices, host_properties(), false);
+  return devices;
+}
+
+std::vector<std::unique_ptr<device_record>> detached_devices() {
+  std::vector<std::unique_ptr<device_record>> devices;
+  add_virtual_devices(devices, host_properties(), true);
   return devices;
 }
 

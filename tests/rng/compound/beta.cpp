@@ -37,7 +37,7 @@ using tarn_test::both_forms;
 using tarn_test::candidate;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 using tarn_test::uniforms;
 
 constexpr std::uint32_t seed = 1618;
@@ -268,7 +268,7 @@ template <typename T, typename Method>
 void expect_inversion(T p, T q, const std::vector<T>& expected) {
   const auto n = static_cast<std::int64_t>(expected.size());
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     const auto got = draw_at_level(form, rng::beta<T, Method>(p, q, T(-0.3), T(1.7)), engine, n,
                                    expected.size());
     EXPECT_EQ(got.values, expected);
@@ -312,7 +312,7 @@ TYPED_TEST(beta_road, one_result_is_the_first_survivor_two_words_each) {
       words += 2;
     }
     for (const auto form : both_forms) {
-      rng::philox4x32x10 engine(gpu_queue(), seed);
+      rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
       const auto got = draw_at_level(form, rng::beta<T, cja>(p, q, -1, 2), engine, 1, 1);
       EXPECT_EQ(got.values[0], std::fma(expected, T(2), T(-1)));
       EXPECT_EQ(got.consumed, static_cast<std::int64_t>(words));
@@ -336,7 +336,7 @@ TYPED_TEST(beta_road, odd_counts_draw_odd_counts_of_candidates) {
     }
   }
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     const auto got = draw_at_level(form, rng::beta<T, cja>(2, 3, 0, 1), engine, 7, 7);
     EXPECT_EQ(got.values, expected);
     EXPECT_EQ(got.consumed, static_cast<std::int64_t>(next));
@@ -348,7 +348,7 @@ TYPED_TEST(beta_road, accurate_results_stay_inside) {
   const T a = T(0.1), b = T(0.7);
   const T shapes[][2] = {{T(0.02), T(0.02)}, {T(0.9), T(0.9)}, {T(0.1), 3}, {3, T(0.1)}, {2, 3}};
   for (const auto& [p, q] : shapes) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     for (const T x : draw(rng::beta<T, cja_accurate>(p, q, a, b), engine, 5000)) {
       ASSERT_TRUE(a <= x && x <= a + b) << x;
     }
@@ -360,7 +360,7 @@ TYPED_TEST(beta_road, shapes_of_which_nothing_would_be_accepted_are_refused) {
   using T = TypeParam;
   constexpr bool single = std::is_same_v<T, float>;
   const auto refusal = [](T p, T q) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     T value = 7;
     const std::string text = tarn_test::message_of<kestrel::tarn::invalid_argument>(
         [&] { rng::generate(rng::beta<T>(p, q), engine, 1, &value).wait(); });
@@ -386,7 +386,7 @@ TYPED_TEST(beta_road, shapes_of_which_nothing_would_be_accepted_are_refused) {
 TYPED_TEST(beta_road, no_results_take_no_words) {
   using T = TypeParam;
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     EXPECT_EQ(draw_at_level(form, rng::beta<T, cja>(2, 3, 0, 1), engine, 0, 0).consumed, 0);
     EXPECT_EQ(draw(rng::uniform<T>(0, 1), engine, 4), uniforms<T>(seed, 4));
   }

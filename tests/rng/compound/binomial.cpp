@@ -25,7 +25,7 @@ using kestrel::tarn::service::_bcdf_params;
 using tarn_test::both_forms;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 
 constexpr std::int32_t greatest = std::numeric_limits<std::int32_t>::max();
 constexpr double nan = std::numeric_limits<double>::quiet_NaN();
@@ -162,7 +162,7 @@ using unsigned_counts = rng::binomial<std::uint32_t>;
 
 TEST(binomial_dispatch, takes_a_fill_a_table_or_rejection) {
   const auto consumed = [](auto form, const counts& distr) {
-    rng::philox4x32x10 engine(gpu_queue(), 7);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
     return draw_at_level(form, distr, engine, 1003, 1003).consumed;
   };
   for (const auto form : both_forms) {
@@ -179,14 +179,14 @@ TEST(binomial_dispatch, takes_a_fill_a_table_or_rejection) {
 }
 
 TEST(binomial_dispatch, fills_with_0_for_no_trials_and_leaves_the_engine) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
-  rng::philox4x32x10 same(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
+  rng::philox4x32x10 same(host_run_gpu_queue(), 7);
   EXPECT_EQ(draw(counts(0, 0.3), engine, 1000), std::vector<std::int32_t>(1000, 0));
   EXPECT_EQ(draw(rng::bits<>(), engine, 10), draw(rng::bits<>(), same, 10));
 }
 
 TEST(binomial_dispatch, gives_one_value_where_nothing_is_left_to_chance) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   EXPECT_EQ(draw(counts(77, 0.0), engine, 1000), std::vector<std::int32_t>(1000, 0));
   EXPECT_EQ(draw(counts(77, 1.0), engine, 1000), std::vector<std::int32_t>(1000, 77));
 }
@@ -194,8 +194,8 @@ TEST(binomial_dispatch, gives_one_value_where_nothing_is_left_to_chance) {
 TEST(binomial_dispatch, gives_either_type_the_same_bits) {
   for (const std::int32_t n : {20, 300}) {
     for (const auto form : both_forms) {
-      rng::mrg32k3a engine(gpu_queue(), 7);
-      rng::mrg32k3a same(gpu_queue(), 7);
+      rng::mrg32k3a engine(host_run_gpu_queue(), 7);
+      rng::mrg32k3a same(host_run_gpu_queue(), 7);
       const auto values = draw_at_level(form, counts(n, 0.5), engine, 1001, 1001);
       const auto others = draw_at_level(form, unsigned_counts(n, 0.5), same, 1001, 1001);
       EXPECT_EQ(values.consumed, others.consumed);
@@ -207,7 +207,7 @@ TEST(binomial_dispatch, gives_either_type_the_same_bits) {
 
 /// Mean and variance of 1e5 draws, each within five of its standard errors.
 void expect_moments(std::int32_t n, double p) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   const auto values = draw(counts(n, p), engine, 100000);
   const double mean = n * p;
   const double variance = mean * (1 - p);
@@ -236,7 +236,7 @@ TEST(binomial_dispatch, draws_have_the_moments_of_the_law) {
 // Kept: outside the triangle the ratios of p = 1/2 weigh the candidates, whose right tail is
 // hardly ever rejected then.
 TEST(binomial_dispatch, leaves_the_law_above_one_half_which_is_kept) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   double mean = 0;
   for (const std::int32_t y : draw(counts(1000, 0.7), engine, 100000)) {
     mean += y / 1e5;

@@ -81,7 +81,7 @@ inline constexpr std::int64_t next_uniforms = 5;
 
 template <typename Engine, typename Model>
 model_expectation<Model> expectation(Model& model, std::int64_t n) {
-  static sycl::queue device = gpu_queue();
+  static sycl::queue device = host_run_gpu_queue();
   const auto group_size = static_cast<std::int64_t>(
       device.get_device().get_info<sycl::info::device::max_work_group_size>());
   Engine engine = model_engine<Engine>(cpu_queue());
@@ -107,7 +107,7 @@ void expect_generate(const Distr& distr, Model& model, const std::vector<std::in
   for (const std::int64_t n : counts) {
     SCOPED_TRACE(n);
     const auto want = expectation<Engine>(model, n);
-    Engine engine = model_engine<Engine>(gpu_queue());
+    Engine engine = model_engine<Engine>(host_run_gpu_queue());
     expect_values(draw(distr, engine, n), want.call.values);
     EXPECT_EQ(draw(rng::uniform<typename Model::source>(0, 1), engine, next_uniforms), want.next);
     if (testing::Test::HasFatalFailure()) {
@@ -121,7 +121,7 @@ template <typename Engine, typename Distr, typename Model>
 void expect_level(const Distr& distr, Model& model) {
   constexpr std::int64_t n = 2001;
   const auto want = expectation<Engine>(model, n);
-  Engine engine = model_engine<Engine>(gpu_queue());
+  Engine engine = model_engine<Engine>(host_run_gpu_queue());
   std::vector<typename Distr::result_type> values(n, marker<typename Distr::result_type>());
   {
     sycl::buffer<typename Distr::result_type, 1> buffer(values.data(), sycl::range<1>(n));

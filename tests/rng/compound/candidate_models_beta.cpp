@@ -144,7 +144,7 @@ TYPED_TEST(candidate_models_beta, a_shape_that_is_no_number_gives_uniforms) {
   tarn_test::for_model_engines([&](auto tag) {
     using engine = typename decltype(tag)::type;
     engine host = tarn_test::model_engine<engine>(tarn_test::cpu_queue());
-    engine device = tarn_test::model_engine<engine>(tarn_test::gpu_queue());
+    engine device = tarn_test::model_engine<engine>(tarn_test::host_run_gpu_queue());
     tarn_test::expect_values(tarn_test::draw(rng::beta<T>(nan, 2, a, b), device, 1001),
                              tarn_test::draw(rng::uniform<T>(a, a + b), host, 1001));
   });

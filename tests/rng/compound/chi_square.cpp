@@ -26,7 +26,7 @@ namespace gpu = kestrel::tarn::rng::detail::gpu;
 using tarn_test::both_forms;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 using tarn_test::marker;
 using tarn_test::same_bits;
 
@@ -41,7 +41,7 @@ TYPED_TEST_SUITE(chi_square_road, tarn_test::real_types);
 /// `each` variates of `distr` for one result, as the same engine gives them.
 template <typename Distr>
 auto ingredients(const Distr& distr, std::int32_t each, std::int64_t n) {
-  rng::philox4x32x10 engine(gpu_queue(), seed);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
   return draw(distr, engine, each * n);
 }
 
@@ -79,7 +79,7 @@ void expect_call(std::int32_t df, std::int64_t n, const std::vector<T>& values,
                  std::int64_t consumed) {
   SCOPED_TRACE(testing::Message() << df << " degrees, n = " << n);
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     const auto got =
         draw_at_level(form, rng::chi_square<T>(df), engine, n, static_cast<std::size_t>(n));
     EXPECT_EQ(got.values, values);
@@ -113,7 +113,7 @@ TYPED_TEST(chi_square_road, other_degrees_are_twice_a_gamma_number_of_half_of_th
   using T = TypeParam;
   for (const std::int32_t df : {5, 7, 15, 17, 18, 1000, std::numeric_limits<std::int32_t>::max()}) {
     for (const std::int64_t n : {1, 6, 1003}) {
-      rng::philox4x32x10 engine(gpu_queue(), seed);
+      rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
       const rng::gamma<T> gamma(static_cast<T>(df) / 2, 0, 2);
       const auto twice = draw_at_level(tarn_test::output_form::pointer, gamma, engine, n,
                                        static_cast<std::size_t>(n));
@@ -126,7 +126,7 @@ TYPED_TEST(chi_square_road, the_engine_stands_behind_the_words_taken) {
   using T = TypeParam;
   const rng::bits<> bits;
   for (const std::int32_t df : {1, 2, 3, 5, 16, 17}) {
-    rng::philox4x32x10 engine(gpu_queue(), seed), skipped(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed), skipped(host_run_gpu_queue(), seed);
     const auto got =
         draw_at_level(tarn_test::output_form::pointer, rng::chi_square<T>(df), engine, 13, 13);
     rng::skip_ahead(skipped, static_cast<std::uint64_t>(got.consumed));
@@ -138,7 +138,7 @@ TYPED_TEST(chi_square_road, a_uniform_of_zero_takes_the_stand_in_of_its_logarith
   using T = TypeParam;
   // This block of the cipher with an all-zero key begins with the word 2^31, least as a signed one.
   const auto at_zero = [] {
-    return tarn_test::philox_at(gpu_queue(), {0, 0}, {2047882832, 0, 0, 0});
+    return tarn_test::philox_at(host_run_gpu_queue(), {0, 0}, {2047882832, 0, 0, 0});
   };
   auto words = at_zero();
   ASSERT_EQ(draw(rng::uniform<T>(0, 1), words, 1)[0], 0);
@@ -152,7 +152,7 @@ TYPED_TEST(chi_square_road, a_uniform_of_zero_takes_the_stand_in_of_its_logarith
 /// address sanitizer tells of a read behind it.
 template <typename T, typename Kernel>
 void expect_within_bounds(std::int32_t each, const Kernel& kernel) {
-  sycl::queue queue = gpu_queue();
+  sycl::queue queue = host_run_gpu_queue();
   constexpr std::size_t guard = 16;
   for (std::size_t n = 0; n <= 9; ++n) {
     const std::size_t count = n * static_cast<std::size_t>(each);
@@ -187,7 +187,7 @@ TYPED_TEST(chi_square_road, kernels_write_the_results_of_the_call_and_nothing_el
 
 TYPED_TEST(chi_square_road, a_product_that_underflows_stays_finite) {
   using T = TypeParam;
-  sycl::queue queue = gpu_queue();
+  sycl::queue queue = host_run_gpu_queue();
   T* memory = sycl::malloc_shared<T>(3, queue);
   memory[0] = memory[1] = std::numeric_limits<T>::min();
   memory[2] = marker<T>();
@@ -200,7 +200,7 @@ TYPED_TEST(chi_square_road, a_buffer_of_exactly_the_results_is_enough) {
   using T = TypeParam;
   for (const std::int32_t df : {1, 2, 3, 16, 5}) {
     for (const std::int64_t n : {1, 2, 3, 5}) {
-      rng::philox4x32x10 engine(gpu_queue(), seed), other(gpu_queue(), seed);
+      rng::philox4x32x10 engine(host_run_gpu_queue(), seed), other(host_run_gpu_queue(), seed);
       std::vector<T> values(static_cast<std::size_t>(n), marker<T>());
       {
         sycl::buffer<T, 1> buffer(values.data(), sycl::range<1>(values.size()));

@@ -45,6 +45,7 @@ class gamma_laws : public device_laws<Engine> {
   }
 };
 TYPED_TEST_SUITE(gamma_laws, engines_of_laws, name_of_engine);
+TARN_REPORTS_CUDA(gamma_laws)
 
 TYPED_TEST(gamma_laws, of_gamma_hold_in_float) {
   this->template expect_laws_of_gamma<float>();

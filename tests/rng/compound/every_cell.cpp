@@ -237,6 +237,8 @@ std::string refusal_of(const row_case& row, const engine_face& on) {
   return "[nothing raised]";
 }
 
+TARN_REPORTS_CUDA(cells)
+
 TEST(cells, rows_on_cpu_queues_alone_are_those_of_the_method_that_devices_lack) {
   int rows_without = 0;
   for (const row_case& row : rows()) {

@@ -30,7 +30,7 @@ using rng::detail::distribution_impl;
 using tarn_test::both_forms;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 using tarn_test::uniforms;
 
 constexpr std::uint32_t seed = 2718;
@@ -137,10 +137,10 @@ TYPED_TEST(gamma_road, accurate_results_are_not_below_the_displacement) {
 template <typename T, typename Method, typename ExponentialMethod>
 void expect_exponential() {
   for (const std::int64_t n : {0, 1, 6, 1001}) {
-    rng::philox4x32x10 plain(gpu_queue(), seed);
+    rng::philox4x32x10 plain(host_run_gpu_queue(), seed);
     const auto expected = draw(rng::exponential<T, ExponentialMethod>(T(-0.5), T(1.25)), plain, n);
     for (const auto form : both_forms) {
-      rng::philox4x32x10 engine(gpu_queue(), seed);
+      rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
       const auto got = draw_at_level(form, rng::gamma<T, Method>(1, T(-0.5), T(1.25)), engine, n,
                                      static_cast<std::size_t>(n));
       EXPECT_EQ(got.values, expected);
@@ -169,7 +169,7 @@ TYPED_TEST(gamma_road, one_result_is_the_first_survivor_of_pairs_four_words_each
       expected = pair[0] >= 0 ? pair[0] : pair[1];
     }
     for (const auto form : both_forms) {
-      rng::philox4x32x10 engine(gpu_queue(), seed);
+      rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
       const auto got = draw_at_level(form, distr, engine, 1, 1);
       EXPECT_EQ(got.values[0], std::fma(expected, T(2), T(-1)));
       EXPECT_EQ(got.consumed, static_cast<std::int64_t>(words));
@@ -187,7 +187,7 @@ TYPED_TEST(gamma_road, odd_counts_end_with_a_pair_for_the_last_result) {
   const auto last = functor(sycl::vec<T, 4>(u[4], u[5], u[6], u[7]));
   ASSERT_TRUE(first[0] >= 0 && first[1] >= 0 && last[0] >= 0);
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     const auto got = draw_at_level(form, distr, engine, 3, 3);
     EXPECT_EQ(got.values, (std::vector<T>{first[0], first[1], last[0]}));
     EXPECT_EQ(got.consumed, 8);
@@ -197,7 +197,7 @@ TYPED_TEST(gamma_road, odd_counts_end_with_a_pair_for_the_last_result) {
 TYPED_TEST(gamma_road, no_results_take_no_words) {
   using T = TypeParam;
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), seed);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), seed);
     EXPECT_EQ(draw_at_level(form, rng::gamma<T, marsaglia>(T(0.5), 0, 1), engine, 0, 0).consumed,
               0);
     EXPECT_EQ(draw(rng::uniform<T>(0, 1), engine, 4), uniforms<T>(seed, 4));
@@ -209,7 +209,7 @@ TYPED_TEST(gamma_road, accurate_draws_the_same_above_the_displacement) {
   // Next to a large displacement most results of a small shape are rounded to it.
   const T a = T(1000);
   for (const T alpha : {T(0.05), T(0.7), T(2)}) {
-    rng::philox4x32x10 plain_engine(gpu_queue(), seed), engine(gpu_queue(), seed);
+    rng::philox4x32x10 plain_engine(host_run_gpu_queue(), seed), engine(host_run_gpu_queue(), seed);
     const auto plain = draw(rng::gamma<T, marsaglia>(alpha, a, T(0.001)), plain_engine, 999);
     const auto accurate = draw(rng::gamma<T, marsaglia_accurate>(alpha, a, T(0.001)), engine, 999);
     EXPECT_EQ(accurate, plain);

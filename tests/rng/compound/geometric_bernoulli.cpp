@@ -26,7 +26,7 @@ using rng::detail::distribution_impl;
 using tarn_test::cpu_queue;
 using tarn_test::draw;
 using tarn_test::draw_into_buffer;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 
 const float next_to_one = std::nextafter(1.0f, 0.0f);
 constexpr float least_word = 0x1p-32f;
@@ -152,8 +152,8 @@ TYPED_TEST(trial_functors, geometric_of_probability_0_in_float_is_the_least_numb
 template <typename Engine, typename Distr>
 void expect_functor_of_uniforms(const Distr& distr) {
   for (const std::int64_t n : {1, 2, 3, 5, 1003}) {
-    Engine engine(gpu_queue(), 77);
-    Engine same(gpu_queue(), 77);
+    Engine engine(host_run_gpu_queue(), 77);
+    Engine same(host_run_gpu_queue(), 77);
     Engine host(cpu_queue(), 77);
     const auto values = draw(distr, engine, n);
     EXPECT_EQ(values, draw_into_buffer(distr, same, n));
@@ -175,7 +175,7 @@ TYPED_TEST(trial_functors, draw_from_an_engine) {
 }
 
 TYPED_TEST(trial_functors, bernoulli_draws_a_share_of_ones) {
-  rng::philox4x32x10 engine(gpu_queue(), 3);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 3);
   const std::int64_t n = 100000;
   TypeParam ones = 0;
   for (const TypeParam value : draw(rng::bernoulli<TypeParam>(0.3), engine, n)) {

@@ -25,7 +25,7 @@ using post = gpu::functors::hypergeometric_post;
 using tarn_test::both_forms;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 
 constexpr std::int32_t greatest = std::numeric_limits<std::int32_t>::max();
 
@@ -233,7 +233,7 @@ using unsigned_counts = rng::hypergeometric<std::uint32_t>;
 
 TEST(hypergeometric_dispatch, takes_a_fill_a_table_or_rejection) {
   const auto consumed = [](auto form, const counts& distr) {
-    rng::philox4x32x10 engine(gpu_queue(), 7);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
     return draw_at_level(form, distr, engine, 1003, 1003).consumed;
   };
   ASSERT_EQ(gpu::canonical_form(1000, 134, 300).mode, 40);
@@ -254,8 +254,8 @@ TEST(hypergeometric_dispatch, fills_with_the_only_value_and_leaves_the_engine) {
                                    {1000, 1000, 300, 300},    {1000, 1000, 700, 700},
                                    {greatest, greatest, 7, 7}};
   for (const auto& [lot, sample, marked, value] : cases) {
-    rng::philox4x32x10 engine(gpu_queue(), 7);
-    rng::philox4x32x10 same(gpu_queue(), 7);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
+    rng::philox4x32x10 same(host_run_gpu_queue(), 7);
     EXPECT_EQ(draw(counts(lot, sample, marked), engine, 1000),
               std::vector<std::int32_t>(1000, value));
     EXPECT_EQ(draw(rng::bits<>(), engine, 10), draw(rng::bits<>(), same, 10));
@@ -265,8 +265,8 @@ TEST(hypergeometric_dispatch, fills_with_the_only_value_and_leaves_the_engine) {
 TEST(hypergeometric_dispatch, gives_either_type_the_same_bits) {
   for (const std::int32_t sample : {60, 600}) {
     for (const auto form : both_forms) {
-      rng::mrg32k3a engine(gpu_queue(), 7);
-      rng::mrg32k3a same(gpu_queue(), 7);
+      rng::mrg32k3a engine(host_run_gpu_queue(), 7);
+      rng::mrg32k3a same(host_run_gpu_queue(), 7);
       const auto values = draw_at_level(form, counts(1000, sample, 300), engine, 1001, 1001);
       const auto others = draw_at_level(form, unsigned_counts(1000, sample, 300), same, 1001, 1001);
       EXPECT_EQ(values.consumed, others.consumed);
@@ -278,7 +278,7 @@ TEST(hypergeometric_dispatch, gives_either_type_the_same_bits) {
 
 /// Mean and variance of 1e5 draws, each within five of its standard errors.
 void expect_moments(std::int32_t lot, std::int32_t sample, std::int32_t marked) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   const auto values = draw(counts(lot, sample, marked), engine, 100000);
   const double l = lot;
   const double mean = sample / l * marked;

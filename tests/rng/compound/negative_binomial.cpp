@@ -29,7 +29,7 @@ using kestrel::tarn::service::_nbar_params;
 using tarn_test::both_forms;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 using tarn_test::message_of;
 
 constexpr std::int32_t greatest = std::numeric_limits<std::int32_t>::max();
@@ -266,7 +266,7 @@ TEST(negative_binomial_dispatch, takes_the_table_below_a_mode_of_100) {
   EXPECT_EQ(gpu::negative_binomial_mode(101, 0.5), 100);
   EXPECT_NEAR(gpu::negative_binomial_mode(100.999, 0.5), 99.999, 1e-12);
   for (const auto form : both_forms) {
-    rng::philox4x32x10 engine(gpu_queue(), 7);
+    rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
     EXPECT_EQ(draw_at_level(form, counts(100.999, 0.5), engine, 1000, 1000).consumed, 1000);
     EXPECT_EQ(draw_at_level(form, counts(50, 0.9999), engine, 1003, 1003).consumed, 1003);
     EXPECT_EQ(draw_at_level(form, counts(0.5, 0.3), engine, 0, 1).consumed, 0);
@@ -278,8 +278,8 @@ TEST(negative_binomial_dispatch, takes_the_table_below_a_mode_of_100) {
 TEST(negative_binomial_dispatch, gives_either_type_the_same_bits) {
   for (const double a : {20.0, 300.0}) {
     for (const auto form : both_forms) {
-      rng::mrg32k3a engine(gpu_queue(), 7);
-      rng::mrg32k3a same(gpu_queue(), 7);
+      rng::mrg32k3a engine(host_run_gpu_queue(), 7);
+      rng::mrg32k3a same(host_run_gpu_queue(), 7);
       const auto values = draw_at_level(form, counts(a, 0.5), engine, 1001, 1001);
       const auto others = draw_at_level(form, unsigned_counts(a, 0.5), same, 1001, 1001);
       EXPECT_EQ(values.consumed, others.consumed);
@@ -292,8 +292,8 @@ TEST(negative_binomial_dispatch, gives_either_type_the_same_bits) {
 TEST(negative_binomial_dispatch, inverts_the_uniforms_of_the_engine) {
   const std::vector<double> cdf = table_of(20.5, 0.25);
   const table_functor functor = on_table(cdf, 20.5, 0.25);
-  rng::philox4x32x10 engine(gpu_queue(), 7);
-  rng::philox4x32x10 same(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
+  rng::philox4x32x10 same(host_run_gpu_queue(), 7);
   const auto values = draw(counts(20.5, 0.25), engine, 5003);
   const auto uniforms = draw(rng::uniform<double>(), same, 5003);
   for (std::size_t i = 0; i < values.size(); ++i) {
@@ -302,18 +302,18 @@ TEST(negative_binomial_dispatch, inverts_the_uniforms_of_the_engine) {
 }
 
 TEST(negative_binomial_dispatch, gives_0_for_certain_successes) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   EXPECT_EQ(draw(counts(7, 1), engine, 1000), std::vector<std::int32_t>(1000, 0));
 }
 
 TEST(negative_binomial_dispatch, gives_the_ceiling_where_all_counts_are_above_it) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   EXPECT_EQ(draw(counts(1e12, 0.5), engine, 500), std::vector<std::int32_t>(500, 2147483520));
 }
 
 TEST(negative_binomial_dispatch, refuses_laws_without_a_hat_and_leaves_the_engine) {
-  rng::philox4x32x10 engine(gpu_queue(), 7);
-  rng::philox4x32x10 same(gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
+  rng::philox4x32x10 same(host_run_gpu_queue(), 7);
   EXPECT_EQ(message_of<invalid_argument>([&] { draw(counts(1.5, 1e-3), engine, 10); }), no_hat);
   EXPECT_EQ(message_of<invalid_argument>([&] {
               draw_at_level(tarn_test::output_form::buffer, unsigned_counts(2, 1e-3), engine, 10,

@@ -30,7 +30,7 @@ using by_normal = rng::poisson_method::gaussian_icdf_based;
 using rng::detail::device_type;
 using tarn_test::canonical_reals;
 using tarn_test::draw;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 
 template <typename T>
 gpu::poisson_gaussian_icdf_based<T> functor_of(double lambda) {
@@ -312,9 +312,9 @@ TYPED_TEST_SUITE(poisson_on, tarn_test::device_cases, tarn_test::case_name);
 /// behind them.
 template <typename Case, typename T>
 void expect_functor_of_uniforms(double lambda, std::int64_t n) {
-  auto uniforms = Case::make(gpu_queue());
-  auto engine = Case::make(gpu_queue());
-  auto same = Case::make(gpu_queue());
+  auto uniforms = Case::make(host_run_gpu_queue());
+  auto engine = Case::make(host_run_gpu_queue());
+  auto same = Case::make(host_run_gpu_queue());
   const auto functor = functor_of<T>(lambda);
   std::vector<T> expected;
   for (const float u : draw(rng::uniform<float>(-1.0f, 1.0f), uniforms, n)) {

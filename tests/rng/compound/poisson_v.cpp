@@ -87,7 +87,7 @@ using tarn_test::canonical_reals;
 using tarn_test::cpu_queue;
 using tarn_test::draw;
 using tarn_test::draw_at_level;
-using tarn_test::gpu_queue;
+using tarn_test::host_run_gpu_queue;
 using tarn_test::output_form;
 
 template <typename T>
@@ -266,8 +266,8 @@ TYPED_TEST_SUITE(poisson_v_on, tarn_test::device_cases, tarn_test::case_name);
 template <typename Case, typename T>
 void expect_model(output_form form, std::int64_t n) {
   const std::vector<double> rates = rates_of(n);
-  auto uniforms = Case::make(gpu_queue());
-  auto engine = Case::make(gpu_queue());
+  auto uniforms = Case::make(host_run_gpu_queue());
+  auto engine = Case::make(host_run_gpu_queue());
   const auto u = draw(rng::uniform<float>(-1.0f, 1.0f), uniforms, n);
   const auto drawn =
       draw_at_level(form, rng::poisson_v<T>(rates), engine, n, static_cast<std::size_t>(n));
@@ -286,8 +286,8 @@ TYPED_TEST(poisson_v_on, gives_each_result_its_rate_and_one_word) {
 }
 
 TEST(poisson_v_on_a_gpu, goes_on_in_the_sequence_from_call_to_call) {
-  rng::philox4x32x10 uniforms(gpu_queue(), 7);
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 uniforms(host_run_gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   const auto u = draw(rng::uniform<float>(-1.0f, 1.0f), uniforms, 60);
   const std::vector<double> first = rates_of(23);
   const std::vector<double> second = rates_of(37);
@@ -299,7 +299,7 @@ TEST(poisson_v_on_a_gpu, goes_on_in_the_sequence_from_call_to_call) {
 
 TEST(poisson_v_on_a_gpu, a_count_of_rates_other_than_that_of_results_is_refused) {
   using Case = tarn_test::engine_case<rng::philox4x32x10, rng::detail::device_type::gpu>;
-  auto engine = Case::make(gpu_queue());
+  auto engine = Case::make(host_run_gpu_queue());
   const rng::poisson_v<> distr(rates_of(10));
   const tarn_test::results<std::int32_t> memory(engine.get_queue(), 20);
   sycl::buffer<std::int32_t, 1> buffer{sycl::range<1>(20)};
@@ -321,7 +321,7 @@ TEST(poisson_v_on_a_gpu, a_count_of_rates_other_than_that_of_results_is_refused)
 struct mark {
   sycl::accessor<std::int32_t, 1, sycl::access_mode::read_write> out;
   int* ran;
-  void operator()(sycl::id<1> i) const {
+  SYCL_EXTERNAL void operator()(sycl::id<1> i) const {
     out[i] = -1;
     *ran = 1;
   }
@@ -363,8 +363,8 @@ class held_output {
 };
 
 TEST(poisson_v_on_a_gpu, with_rates_that_have_to_be_copied_it_is_over_on_return) {
-  rng::philox4x32x10 uniforms(gpu_queue(), 7);
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 uniforms(host_run_gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   const std::vector<double> rates = rates_of(100);
   const auto u = draw(rng::uniform<float>(-1.0f, 1.0f), uniforms, 100);
   held_output out(engine.get_queue(), 100);
@@ -376,8 +376,8 @@ TEST(poisson_v_on_a_gpu, with_rates_that_have_to_be_copied_it_is_over_on_return)
 }
 
 TEST(poisson_v_on_a_gpu, rates_that_the_kernel_reaches_are_read_in_place_without_waiting) {
-  rng::philox4x32x10 uniforms(gpu_queue(), 7);
-  rng::philox4x32x10 engine(gpu_queue(), 7);
+  rng::philox4x32x10 uniforms(host_run_gpu_queue(), 7);
+  rng::philox4x32x10 engine(host_run_gpu_queue(), 7);
   const auto u = draw(rng::uniform<float>(-1.0f, 1.0f), uniforms, 100);
   const std::vector<double> rates = rates_of(100);
   const std::vector<double> others(rates.rbegin(), rates.rend());

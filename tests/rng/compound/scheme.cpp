@@ -79,7 +79,7 @@ struct copy_candidates {
   const T* from;
   sycl::accessor<T, 1, sycl::access_mode::write> into;
 
-  void operator()(sycl::id<1> item) const { into[item] = from[item[0]]; }
+  SYCL_EXTERNAL void operator()(sycl::id<1> item) const { into[item] = from[item[0]]; }
 };
 
 struct failing_draw : std::runtime_error {
@@ -127,7 +127,7 @@ template <typename T>
 struct doubling {
   std::int64_t* calls;
 
-  T operator()(T v) const {
+  SYCL_EXTERNAL T operator()(T v) const {
     sycl::atomic_ref<std::int64_t, sycl::memory_order::relaxed, sycl::memory_scope::device>(*calls)
         .fetch_add(1);
     return v * 2 + 1;
@@ -242,10 +242,11 @@ template <typename T>
 class rejection : public testing::Test {};
 using candidate_types = testing::Types<std::int32_t, float, double>;
 TYPED_TEST_SUITE(rejection, candidate_types);
+TARN_REPORTS_CUDA(rejection)
 
 TEST(rejection_shapes, of_the_devices_are_all_there) {
   std::vector<std::size_t> sizes;
-  for (const sycl::queue& queue : gpu_queues()) {
+  for (const sycl::queue& queue : host_run_gpu_queues()) {
     sizes.push_back(group_size(queue));
   }
   EXPECT_EQ(sizes, (std::vector<std::size_t>{64, 128, 250, 256, 1024}));
@@ -349,7 +350,7 @@ TYPED_TEST(rejection, takes_zeros_and_leaves_what_is_not_a_number) {
 /// Leaves the sign of a zero.
 template <typename T>
 struct identity {
-  T operator()(T v) const { return v; }
+  SYCL_EXTERNAL T operator()(T v) const { return v; }
 };
 
 TYPED_TEST(rejection, moves_values_as_they_are) {

@@ -26,6 +26,17 @@ inline void check_window(const range<Dimensions>& memory, const range<Dimensions
     }
   }
 }
+
+// Whether an accessor gives up all that the buffer's memory holds.
+template <access_mode Mode, typename Buffer, int Dimensions>
+bool discards(const Buffer& source, const range<Dimensions>& part,
+              const property_list& properties) {
+  const bool gives_up = Mode == access_mode::discard_write ||
+                        Mode == access_mode::discard_read_write ||
+                        (mode_writes(Mode) && property_access::has<property::no_init>(properties));
+  return gives_up &&
+         part.size() * sizeof(typename Buffer::value_type) == buffer_access::core(source)->bytes();
+}
 }  // namespace detail
 
 template <typename DataT, int Dimensions = 1,
@@ -65,9 +76,10 @@ class accessor : public detail::window<detail::element_for<DataT, Mode>, Dimensi
       : accessor(source, part, id<Dimensions>(), properties) {}
   template <typename Allocator>
   accessor(buffer_of<Allocator>& source, range<Dimensions> part, id<Dimensions> offset,
-           const property_list& = {})
+           const property_list& properties = {})
       : base(detail::buffer_access::data(source), source.get_range(), part, offset),
-        core_(detail::buffer_access::core(source).get()) {
+        core_(detail::buffer_access::core(source).get()),
+        keeps_(!detail::discards<Mode>(source, part, properties)) {
     detail::check_window(source.get_range(), part, offset);
   }
   template <typename Allocator, typename Tag,
@@ -81,7 +93,14 @@ class accessor : public detail::window<detail::element_for<DataT, Mode>, Dimensi
   accessor(buffer_of<Allocator>& source, handler& group, const Rest&... rest)
       : accessor(source, rest...) {
     placeholder_ = false;
-    bind(group);
+    if constexpr (Target == target::device) {
+      if (core_ != nullptr) {
+        this->first_ = static_cast<element_type*>(
+            detail::require_on_device(group, *core_, host_address(), use()));
+      }
+    } else {
+      bind(group);
+    }
   }
 
   // Reading through an accessor made for more.
@@ -95,7 +114,8 @@ class accessor : public detail::window<detail::element_for<DataT, Mode>, Dimensi
       : base(const_cast<buffer_element*>(other.memory_start()), other.memory_, other.range_,
              other.offset_),
         core_(other.core_),
-        placeholder_(other.placeholder_) {}
+        placeholder_(other.placeholder_),
+        keeps_(other.keeps_) {}
 
   bool is_placeholder() const { return placeholder_; }
   void swap(accessor& other) { std::swap(*this, other); }
@@ -119,14 +139,26 @@ class accessor : public detail::window<detail::element_for<DataT, Mode>, Dimensi
   friend struct std::hash<accessor>;
   template <typename D, int N, access_mode M, target G, access::placeholder P>
   friend class accessor;
+  detail::access_kind use() const { return {detail::mode_writes(Mode), keeps_}; }
+  void* host_address() const { return const_cast<buffer_element*>(this->first_); }
   void bind(handler& group) const {
     if (core_ != nullptr) {
-      detail::require_access(group, *core_, detail::mode_writes(Mode));
+      detail::require_on_host(group, *core_, use());
     }
+  }
+  // The same window of the host's memory, which the group then uses in place of its device's.
+  accessor on_host(handler& group) const {
+    accessor result = *this;
+    if (core_ != nullptr) {
+      result.first_ =
+          static_cast<element_type*>(detail::back_on_host(group, *core_, host_address()));
+    }
+    return result;
   }
 
   detail::buffer_core* core_ = nullptr;
   bool placeholder_ = true;
+  bool keeps_ = true;
 };
 
 namespace detail {
@@ -185,10 +217,12 @@ class host_accessor : public detail::window<detail::element_for<DataT, Mode>, Di
       : host_accessor(source, part, id<Dimensions>(), properties) {}
   template <typename Allocator>
   host_accessor(buffer_of<Allocator>& source, range<Dimensions> part, id<Dimensions> offset,
-                const property_list& = {})
+                const property_list& properties = {})
       : base(detail::buffer_access::data(source), source.get_range(), part, offset) {
     detail::check_window(source.get_range(), part, offset);
-    hold_ = detail::hold_for_host(detail::buffer_access::core(source), detail::mode_writes(Mode));
+    hold_ = detail::hold_for_host(
+        detail::buffer_access::core(source),
+        {detail::mode_writes(Mode), !detail::discards<Mode>(source, part, properties)});
   }
   template <typename Allocator, access_mode M>
   host_accessor(buffer_of<Allocator>& source, range<Dimensions> part, id<Dimensions> offset,

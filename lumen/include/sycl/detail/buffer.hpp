@@ -35,6 +35,8 @@ class typed_buffer final : public buffer_core {
     if (place == nullptr && count != 0) {
       owned_ = std::allocator_traits<Allocator>::allocate(allocator_, count);
       place = owned_;
+    } else {
+      define();
     }
     data_ = place;
   }
@@ -44,7 +46,8 @@ class typed_buffer final : public buffer_core {
     }
   }
   void write_back() override {
-    if (enabled_ && final_) {
+    const bool wanted = enabled_ && (final_ || owned_ == nullptr);
+    if (wanted && come_home() && final_) {
       final_(static_cast<const T*>(data_), count_);
     }
   }
@@ -149,6 +152,7 @@ class buffer {
       : range_(static_cast<std::size_t>(std::distance(first, last))), properties_(properties) {
     make(nullptr, allocator);
     std::copy(first, last, core().elements());
+    core().define();
   }
   // A contiguous container; written back when it is not const.
   template <typename Container, int D = Dimensions, typename = std::enable_if_t<D == 1>,
@@ -299,7 +303,10 @@ class buffer {
     handle_ = std::make_shared<detail::buffer_handle>(
         std::make_shared<core_type>(range_.size(), place, allocator));
   }
-  void load(const T* from) { std::copy_n(from, range_.size(), core().elements()); }
+  void load(const T* from) {
+    std::copy_n(from, range_.size(), core().elements());
+    core().define();
+  }
   template <typename Shared>
   void from_shared(const Shared& shared, T* raw, const AllocatorT& allocator) {
     make(detail::property_access::has<property::buffer::use_host_ptr>(properties_) ? raw : nullptr,

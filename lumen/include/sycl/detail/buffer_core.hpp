@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // The memory behind buffers without its type: where it lies, who uses it, how it goes home.
-// All devices of lumen share the host's memory, so a buffer has one place only.
+// A buffer lies in the host's memory, which most devices share; devices with memory of their own
+// work on copies, which are moved when they are needed.
 #pragma once
 
+#include <atomic>
 #include <cstddef>
 #include <memory>
 
@@ -15,6 +17,14 @@ class handler;
 
 namespace detail {
 class access_record;
+class buffer_copies;
+struct device_record;
+
+// What a user does to the contents: one that does not keep them reads nothing of what was there.
+struct access_kind {
+  bool writes;
+  bool keeps;
+};
 
 class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core> {
  public:
@@ -26,15 +36,31 @@ class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core
   // Copies the contents to the place they were promised to, if there is one.
   virtual void write_back() = 0;
 
+  // Makes the host's memory current for a user that is about to begin.
+  void to_host(access_kind use);
+  // The copy on a device with memory of its own, made at first use; errc::memory_allocation.
+  void* address_on(const device_record& device);
+  // The host's address for one in the copy on a device; others stay as they are.
+  void* host_address(const device_record& device, void* address);
+  // To be asked for only after address_on.
+  buffer_copies& copies() const { return *copies_.load(std::memory_order_acquire); }
+  // There are contents: somebody has written them, or is about to.
+  void define() noexcept { defined_.store(true, std::memory_order_relaxed); }
+
   void* data() const { return data_; }
   std::size_t bytes() const { return bytes_; }
   access_record& record() const { return *record_; }
 
  protected:
+  // As to_host, for the end of the buffer: a failure is told on the error stream.
+  bool come_home() noexcept;
+
   void* data_ = nullptr;
 
  private:
   std::size_t bytes_;
+  std::atomic<bool> defined_{false};
+  std::atomic<buffer_copies*> copies_{nullptr};
   std::unique_ptr<access_record> record_;
 };
 
@@ -50,11 +76,17 @@ class LUMEN_EXPORT buffer_handle {
   const std::shared_ptr<buffer_core> core;
 };
 
-// Orders a command group after the earlier users of the buffer.
-LUMEN_EXPORT void require_access(handler& group, buffer_core& core, bool writes);
+// Orders a command group after the earlier users of the buffer, whose memory on the host it uses.
+LUMEN_EXPORT void require_on_host(handler& group, buffer_core& core, access_kind use);
+// The same for the memory of the group's device. What comes back stands there for `host`, an
+// address in the buffer's memory.
+LUMEN_EXPORT void* require_on_device(handler& group, buffer_core& core, void* host,
+                                     access_kind use);
+// The group uses the host's memory after all; the address there for one on the group's device.
+LUMEN_EXPORT void* back_on_host(handler& group, buffer_core& core, void* address);
 // Waits for the buffer and keeps command groups away from it until the result is destroyed.
 LUMEN_EXPORT std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core,
-                                                 bool writes);
+                                                 access_kind use);
 // 64-byte aligned memory for buffers without an allocator of their own; throws
 // errc::memory_allocation.
 LUMEN_EXPORT void* allocate_buffer(std::size_t bytes);

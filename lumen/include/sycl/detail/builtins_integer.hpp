@@ -31,7 +31,7 @@ LUMEN_NAMESPACE_BEGIN
   }                                                \
   LUMEN_LIFT_3(integer_vec, name)
 
-LUMEN_INTEGER_1(abs, x < 0 ? detail::wrapping_subtract(T(0), x) : x)
+LUMEN_INTEGER_1(abs, detail::is_negative(x) ? detail::wrapping_subtract(T(0), x) : x)
 LUMEN_INTEGER_1(clz, detail::leading_zeros(x))
 LUMEN_INTEGER_1(ctz, detail::trailing_zeros(x))
 LUMEN_INTEGER_1(popcount, detail::count_ones(x))

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The math functions of SYCL 2020, section 4.17.5. On the host each is the C library's own where
-// there is one; mad is fused, so that it gives the same bits wherever it runs.
+// there is one, in code for GPUs that of the CUDA math library, under the same names; mad is fused,
+// so that it gives the same bits wherever it runs.
 #pragma once
 
 #include <cmath>
@@ -30,7 +31,7 @@ LUMEN_REAL_1(cospi, detail::cos_pi(x))
 LUMEN_REAL_1(erf, std::erf(x))
 LUMEN_REAL_1(erfc, std::erfc(x))
 LUMEN_REAL_1(exp, std::exp(x))
-LUMEN_REAL_1(exp10, std::pow(decltype(x)(10), x))
+LUMEN_REAL_1(exp10, detail::power_of_ten(x))
 LUMEN_REAL_1(exp2, std::exp2(x))
 LUMEN_REAL_1(expm1, std::expm1(x))
 LUMEN_REAL_1(fabs, std::fabs(x))
@@ -43,7 +44,7 @@ LUMEN_REAL_1(log2, std::log2(x))
 LUMEN_REAL_1(logb, std::logb(x))
 LUMEN_REAL_1(rint, std::rint(x))
 LUMEN_REAL_1(round, std::round(x))
-LUMEN_REAL_1(rsqrt, decltype(x)(1) / std::sqrt(x))
+LUMEN_REAL_1(rsqrt, detail::reciprocal_root(x))
 LUMEN_REAL_1(sin, std::sin(x))
 LUMEN_REAL_1(sinh, std::sinh(x))
 LUMEN_REAL_1(sinpi, detail::sin_pi(x))

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The native and half-precision functions of SYCL 2020, section 4.17.5: float only. The host has
-// no faster forms, so that these are the full ones in both namespaces.
+// no faster forms, and GPUs are not to differ from it by more than they must, so that these are
+// the full ones in both namespaces.
 #pragma once
 
 #include "builtins_lift.hpp"

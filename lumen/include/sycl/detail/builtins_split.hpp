@@ -21,8 +21,11 @@ SYCL_EXTERNAL T split_fract(T x, T* floor) {
 }
 template <typename T>
 SYCL_EXTERNAL T split_frexp(T x, int* exponent) {
-  *exponent = 0;  // The C library leaves it open for infinities and NaN.
-  return std::frexp(x, exponent);
+  const T part = std::frexp(x, exponent);
+  if (!std::isfinite(x)) {
+    *exponent = 0;  // The C library and that of CUDA leave it open.
+  }
+  return part;
 }
 template <typename T>
 SYCL_EXTERNAL T split_lgamma_r(T x, int* sign) {
@@ -34,8 +37,7 @@ SYCL_EXTERNAL T split_modf(T x, T* whole) {
 }
 template <typename T>
 SYCL_EXTERNAL T split_sincos(T x, T* cosine) {
-  *cosine = std::cos(x);
-  return std::sin(x);
+  return sine_and_cosine(x, cosine);
 }
 template <typename T>
 SYCL_EXTERNAL T split_remquo(T x, T y, int* quotient) {

@@ -1,16 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
 // Closure records: what a command group asks to run, owned by its task. The templates hold the
 // user's function and the loop over items, which thus inlines; all else sees the base classes.
+// In a unit compiled by nvcc they hold the kernel's CUDA code as well.
 #pragma once
 
 #include <cstddef>
 #include <type_traits>
 #include <utility>
 
+#include "call_kernel.hpp"
 #include "device_copyable.hpp"
-#include "group_frame.hpp"
-#include "item.hpp"
-#include "nd_item.hpp"
+#include "info.hpp"
+#include "launch_shape.hpp"
+#if defined(__CUDACC__)
+#include "cuda_launch.hpp"
+#endif
 
 LUMEN_NAMESPACE_BEGIN
 
@@ -18,36 +22,7 @@ class interop_handle;
 
 namespace detail {
 
-// Sizes of a launch; local_range matters for groups only.
-struct launch_shape {
-  int dimensions = 1;
-  std::size_t global_range[3] = {1, 1, 1};
-  std::size_t local_range[3] = {1, 1, 1};
-  std::size_t offset[3] = {0, 0, 0};
-  std::size_t local_bytes = 0;
-
-  std::size_t total() const { return global_range[0] * global_range[1] * global_range[2]; }
-};
-
-template <int Dimensions>
-inline launch_shape shape_of(const range<Dimensions>& global, const id<Dimensions>& offset) {
-  launch_shape shape;
-  shape.dimensions = Dimensions;
-  for (int d = 0; d < Dimensions; ++d) {
-    shape.global_range[d] = global[d];
-    shape.offset[d] = offset[d];
-  }
-  return shape;
-}
-
-template <int Dimensions>
-inline launch_shape shape_of(const nd_range<Dimensions>& ranges) {
-  launch_shape shape = shape_of(ranges.get_global_range(), ranges.get_offset());
-  for (int d = 0; d < Dimensions; ++d) {
-    shape.local_range[d] = ranges.get_local_range()[d];
-  }
-  return shape;
-}
+class command_stream;
 
 // Kernels carry bytes only: closures that own something (strings, containers, buffers, queues)
 // do not go to a device. Types declared device copyable may say otherwise of themselves.
@@ -72,19 +47,49 @@ class LUMEN_EXPORT host_command : public command {
   virtual void run(const interop_handle& handle) = 0;
 };
 
+// Goes into a stream of the device.
+class LUMEN_EXPORT device_command : public command {
+ public:
+  ~device_command() override;
+  virtual void enqueue(command_stream& stream, const launch_shape& shape) = 0;
+  // Called once when the work is done, before its closure goes.
+  virtual void finish();
+};
+
 // Runs over items on a device; each kind of launch overrides its own function.
-class LUMEN_EXPORT kernel_command : public command {
+class LUMEN_EXPORT kernel_command : public device_command {
  public:
   ~kernel_command() override;
+  void enqueue(command_stream& stream, const launch_shape& shape) override;
   // The items [begin, end) of a range, in row-major order.
   virtual void run_items(std::size_t begin, std::size_t end) const;
   // Items of one group, from frame.next_item on, until none is left or the group diverged.
   virtual void run_group(group_frame& frame) const;
   // True for a launch over an nd_range.
   virtual bool needs_groups() const;
-  // Called once after the last item.
-  virtual void finish();
+  // Whether the program holds code of this kernel for devices of a backend.
+  virtual bool serves(backend kind) const;
+  // Puts the native code into the stream; throws what the platform said.
+  virtual void launch_native(const native_launch& launch) const;
 };
+
+// What a unit's compiler makes of a kernel. It is part of the types below, so that what two
+// compilers made of one kernel is never taken for one class. A kernel that is to run on CUDA
+// devices is launched from units compiled by nvcc alone.
+enum class code_for { host, host_and_cuda };
+#if defined(__CUDACC__)
+#define LUMEN_UNIT_CODE code_for::host_and_cuda
+#define LUMEN_NATIVE_KERNEL(...)                                   \
+  bool serves(backend kind) const override {                       \
+    return kind == backend::host || kind == backend::cuda;         \
+  }                                                                \
+  void launch_native(const native_launch& launch) const override { \
+    __VA_ARGS__;                                                   \
+  }
+#else
+#define LUMEN_UNIT_CODE code_for::host
+#define LUMEN_NATIVE_KERNEL(...)
+#endif
 
 template <typename Function>
 class host_function final : public host_command {
@@ -104,53 +109,18 @@ class host_function final : public host_command {
   Function function_;
 };
 
-template <typename Function>
+template <typename Function, code_for Code = LUMEN_UNIT_CODE>
 class single_kernel final : public kernel_command {
  public:
   explicit single_kernel(const Function& function) : function_(function) {}
   void run_items(std::size_t, std::size_t) const override { function_(); }
+  LUMEN_NATIVE_KERNEL(launch_cuda_single(launch, function_))
 
  private:
   Function function_;
 };
 
-// Calls the kernel with the item, which becomes an integer where the kernel takes one. A kernel
-// may take a narrower integer than size_t: the range check makes sure that the ids fit.
-#pragma GCC diagnostic push
-#pragma GCC diagnostic ignored "-Wconversion"
-template <typename Function, int Dimensions, typename... Rest>
-SYCL_EXTERNAL inline void call_with_item(const Function& function,
-                                         const item<Dimensions, true>& position, Rest&... rest) {
-  if constexpr (std::is_invocable_v<const Function&, item<Dimensions, true>, Rest&...>) {
-    function(position, rest...);
-  } else if constexpr (std::is_invocable_v<const Function&, item<Dimensions, false>, Rest&...>) {
-    function(item_maker::plain(position.get_id(), position.get_range()), rest...);
-  } else {
-    function(position.get_id(), rest...);
-  }
-}
-#pragma GCC diagnostic pop
-
-// Visits the items [begin, end) of a range in row-major order.
-template <int Dimensions, typename Visit>
-SYCL_EXTERNAL inline void for_items(const range<Dimensions>& sizes, const id<Dimensions>& offset,
-                                    std::size_t begin, std::size_t end, const Visit& visit) {
-  if constexpr (Dimensions == 1) {
-    for (std::size_t i = begin; i < end; ++i) {
-      visit(item_maker::with_offset<1>(id<1>(i + offset[0]), sizes, offset));
-    }
-  } else {
-    id<Dimensions> index = index_of<Dimensions>(begin, sizes);
-    for (std::size_t i = begin; i < end; ++i) {
-      visit(item_maker::with_offset<Dimensions>(index + offset, sizes, offset));
-      for (int d = Dimensions - 1; d >= 0 && ++index[d] == sizes[d] && d > 0; --d) {
-        index[d] = 0;
-      }
-    }
-  }
-}
-
-template <int Dimensions, typename Function>
+template <int Dimensions, typename Function, code_for Code = LUMEN_UNIT_CODE>
 class range_kernel final : public kernel_command {
  public:
   range_kernel(const range<Dimensions>& sizes, const id<Dimensions>& offset,
@@ -163,6 +133,7 @@ class range_kernel final : public kernel_command {
       call_with_item(function_, position);
     });
   }
+  LUMEN_NATIVE_KERNEL(launch_cuda_range(launch, function_, sizes_, offset_))
 
  private:
   range<Dimensions> sizes_;
@@ -170,7 +141,7 @@ class range_kernel final : public kernel_command {
   Function function_;
 };
 
-template <int Dimensions, typename Function>
+template <int Dimensions, typename Function, code_for Code = LUMEN_UNIT_CODE>
 class nd_range_kernel final : public kernel_command {
  public:
   explicit nd_range_kernel(const Function& function) : function_(function) {}
@@ -183,10 +154,14 @@ class nd_range_kernel final : public kernel_command {
       }
     }
   }
+  LUMEN_NATIVE_KERNEL(launch_cuda_groups<Dimensions>(launch, function_))
 
  private:
   Function function_;
 };
+
+#undef LUMEN_NATIVE_KERNEL
+#undef LUMEN_UNIT_CODE
 
 }  // namespace detail
 

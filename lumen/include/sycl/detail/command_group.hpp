@@ -16,14 +16,17 @@ namespace detail {
 
 class buffer_core;
 class queue_core;
+struct device_record;
 
 // The task keeps the memory, even of a buffer that dies inside its command group function.
 struct access_request {
   std::shared_ptr<buffer_core> core;
   bool writes;
+  bool keeps;                  // false: what was there before is not read
+  const device_record* place;  // whose copy is used; null: the host's
 };
 
-enum class work_kind : char { none, host, kernel };
+enum class work_kind : char { none, host, device };
 
 struct command_group {
   queue_core* queue = nullptr;

@@ -136,7 +136,7 @@ detail::aspect_rating aspect_selector(Aspects... wanted) {
 }
 template <aspect... Wanted>
 detail::aspect_rating aspect_selector() {
-  return {{Wanted...}, {}};
+  return detail::aspect_rating{{Wanted...}, {}};
 }
 
 LUMEN_NAMESPACE_END

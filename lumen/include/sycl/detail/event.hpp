@@ -54,7 +54,8 @@ class LUMEN_EXPORT event {
   static void wait_and_throw(const std::vector<event>& events);
   // The direct dependencies of a task that has not completed.
   std::vector<event> get_wait_list();
-  sycl::backend get_backend() const noexcept { return sycl::backend::host; }
+  // The host's for an event that is already complete.
+  sycl::backend get_backend() const noexcept;
   template <typename Param>
   typename Param::return_type get_info() const;
   // Throws errc::invalid when the queue lacks property::queue::enable_profiling.

@@ -133,11 +133,11 @@ class group {
     (events.wait(), ...);
   }
 
-  friend bool operator==(const group& a, const group& b) {
+  SYCL_EXTERNAL friend bool operator==(const group& a, const group& b) {
     return a.get_group_id() == b.get_group_id() && a.get_local_range() == b.get_local_range() &&
            a.get_group_range() == b.get_group_range();
   }
-  friend bool operator!=(const group& a, const group& b) { return !(a == b); }
+  SYCL_EXTERNAL friend bool operator!=(const group& a, const group& b) { return !(a == b); }
 
  private:
   friend struct detail::group_access;
@@ -173,10 +173,10 @@ class sub_group {
   SYCL_EXTERNAL linear_id_type get_local_linear_range() const { return 1; }
   SYCL_EXTERNAL bool leader() const { return true; }
 
-  friend bool operator==(const sub_group& a, const sub_group& b) {
+  SYCL_EXTERNAL friend bool operator==(const sub_group& a, const sub_group& b) {
     return a.index_ == b.index_ && a.count_ == b.count_;
   }
-  friend bool operator!=(const sub_group& a, const sub_group& b) { return !(a == b); }
+  SYCL_EXTERNAL friend bool operator!=(const sub_group& a, const sub_group& b) { return !(a == b); }
 
  private:
   template <int D>

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // What the items of one running work-group share on the host: where the group stands, which
 // item comes next, how many have met the current barrier. One frame serves one group at a time.
+// In code for a GPU each item has a frame of its own, of which only the place of the group is used.
 #pragma once
 
 #include <cstddef>
@@ -46,12 +47,31 @@ SYCL_EXTERNAL inline Coordinates<Dimensions> coordinates_from(const std::size_t*
 }
 
 // Parks the calling item until all items of its group have come here.
-LUMEN_EXPORT void group_wait(group_frame& frame);
+LUMEN_EXPORT void host_group_wait(group_frame& frame);
+
+SYCL_EXTERNAL inline void group_wait(group_frame& frame) {
+#if defined(__CUDA_ARCH__)
+  (void)frame;
+  __syncthreads();
+#else
+  host_group_wait(frame);
+#endif
+}
 
 // The local memory of the group that this thread runs. Initial-exec keeps an access to a local
 // accessor at two loads; the variable needs 8 bytes of static thread-local space.
 extern __thread char* local_memory_base __attribute__((visibility("default")))
 __attribute__((tls_model("initial-exec")));
+
+// The start of the group's block of local memory.
+SYCL_EXTERNAL inline char* local_memory() {
+#if defined(__CUDA_ARCH__)
+  extern __shared__ __align__(128) char lumen_local_memory[];
+  return lumen_local_memory;
+#else
+  return local_memory_base;
+#endif
+}
 
 }  // namespace detail
 

@@ -32,15 +32,16 @@ template <typename Ranges, typename... Rest>
 void launch_reduction(handler& group, const Ranges& ranges, const Rest&... rest);
 }  // namespace detail
 
-// What a host_task may ask of the backend: the host has no native objects.
+// What a host_task may ask of the backend of its queue.
 class interop_handle {
  public:
   interop_handle() = delete;
-  sycl::backend get_backend() const noexcept { return sycl::backend::host; }
+  sycl::backend get_backend() const noexcept { return kind_; }
 
  private:
   friend class detail::task;
-  explicit interop_handle(int) {}
+  explicit interop_handle(sycl::backend kind) : kind_(kind) {}
+  sycl::backend kind_;
 };
 
 class LUMEN_EXPORT handler {
@@ -68,7 +69,8 @@ class LUMEN_EXPORT handler {
            std::make_unique<detail::single_kernel<Function>>(function));
   }
 
-  // Throws errc::runtime when the range or an offset exceeds a signed 32-bit integer.
+  // Launches throw errc::kernel_not_supported when the program has no code of the kernel for the
+  // device. Throws errc::runtime when the range or an offset exceeds a signed 32-bit integer.
   // The range may also be given as a number or in braces.
   template <typename KernelName = void, typename... Rest>
   void parallel_for(range<1> sizes, const Rest&... rest) {
@@ -113,9 +115,10 @@ class LUMEN_EXPORT handler {
     fill_bytes(pointer, &pattern, sizeof(T), count);
   }
 
+  // Through accessors the host does the work, on its own memory.
   template <typename T, int D, access_mode M, target G, access::placeholder P>
   void fill(accessor<T, D, M, G, P> to, const T& value) {
-    host_task([to, value] {
+    host_task([to = to.on_host(*this), value] {
       for (auto& element : to) {
         element = value;
       }
@@ -123,19 +126,19 @@ class LUMEN_EXPORT handler {
   }
   template <typename T, int D, access_mode M, target G, access::placeholder P, typename U>
   void copy(accessor<T, D, M, G, P> from, U* to) {
-    host_task([from, to] { std::copy(from.begin(), from.end(), to); });
+    host_task([from = from.on_host(*this), to] { std::copy(from.begin(), from.end(), to); });
   }
   template <typename T, int D, access_mode M, target G, access::placeholder P, typename U>
   void copy(accessor<T, D, M, G, P> from, std::shared_ptr<U> to) {
-    host_task([from, to] { std::copy(from.begin(), from.end(), to.get()); });
+    host_task([from = from.on_host(*this), to] { std::copy(from.begin(), from.end(), to.get()); });
   }
   template <typename U, typename T, int D, access_mode M, target G, access::placeholder P>
   void copy(const U* from, accessor<T, D, M, G, P> to) {
-    host_task([from, to] { std::copy_n(from, to.size(), to.begin()); });
+    host_task([from, to = to.on_host(*this)] { std::copy_n(from, to.size(), to.begin()); });
   }
   template <typename U, typename T, int D, access_mode M, target G, access::placeholder P>
   void copy(std::shared_ptr<U> from, accessor<T, D, M, G, P> to) {
-    host_task([from, to] { std::copy_n(from.get(), to.size(), to.begin()); });
+    host_task([from, to = to.on_host(*this)] { std::copy_n(from.get(), to.size(), to.begin()); });
   }
   template <typename T, int D, access_mode M, target G, access::placeholder P, typename U, int E,
             access_mode N, target H, access::placeholder Q>
@@ -143,12 +146,13 @@ class LUMEN_EXPORT handler {
     if (to.size() < from.size()) {
       detail::throw_invalid("copy: the destination is smaller than the source");
     }
-    host_task([from, to] { std::copy(from.begin(), from.end(), to.begin()); });
+    host_task([from = from.on_host(*this), to = to.on_host(*this)] {
+      std::copy(from.begin(), from.end(), to.begin());
+    });
   }
-  // The host sees a buffer's memory at all times; only the order is kept.
   template <typename T, int D, access_mode M, target G, access::placeholder P>
-  void update_host(accessor<T, D, M, G, P>) {
-    host_task([] {});
+  void update_host(accessor<T, D, M, G, P> from) {
+    host_task([from = from.on_host(*this)] {});
   }
 
  private:
@@ -180,6 +184,7 @@ class LUMEN_EXPORT handler {
   }
   void launch(const detail::launch_shape& shape, std::unique_ptr<detail::kernel_command> work);
   void run_on_host(std::unique_ptr<detail::host_command> work);
+  void run_on_device(std::unique_ptr<detail::device_command> work);
   void fill_bytes(void* pointer, const void* pattern, std::size_t pattern_bytes, std::size_t count);
   event finish();
 

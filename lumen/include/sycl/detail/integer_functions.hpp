@@ -28,6 +28,16 @@ using wrapping = std::conditional_t<(sizeof(T) < sizeof(unsigned)), unsigned, un
 template <typename T>
 using widest = std::conditional_t<std::is_signed_v<T>, std::int64_t, std::uint64_t>;
 
+// Without a comparison that no unsigned value meets, which compilers warn about.
+template <typename T>
+SYCL_EXTERNAL constexpr bool is_negative([[maybe_unused]] T x) {
+  if constexpr (std::is_signed_v<T>) {
+    return x < 0;
+  } else {
+    return false;
+  }
+}
+
 template <typename T>
 SYCL_EXTERNAL constexpr T wrapping_add(T x, T y) {
   return static_cast<T>(static_cast<wrapping<T>>(x) + static_cast<wrapping<T>>(y));
@@ -45,7 +55,7 @@ template <typename T>
 SYCL_EXTERNAL constexpr T add_saturated(T x, T y) {
   constexpr T highest = std::numeric_limits<T>::max();
   constexpr T lowest = std::numeric_limits<T>::min();
-  if (y >= 0) {
+  if (!is_negative(y)) {
     return x > highest - y ? highest : static_cast<T>(x + y);
   }
   return x < lowest - y ? lowest : static_cast<T>(x + y);
@@ -55,7 +65,7 @@ template <typename T>
 SYCL_EXTERNAL constexpr T subtract_saturated(T x, T y) {
   constexpr T highest = std::numeric_limits<T>::max();
   constexpr T lowest = std::numeric_limits<T>::min();
-  if (y >= 0) {
+  if (!is_negative(y)) {
     return x < lowest + y ? lowest : static_cast<T>(x - y);
   }
   return x > highest + y ? highest : static_cast<T>(x - y);
@@ -77,6 +87,15 @@ SYCL_EXTERNAL constexpr T multiply_high(T x, T y) {
   if constexpr (sizeof(T) < 8) {
     return static_cast<T>((static_cast<widest<T>>(x) * static_cast<widest<T>>(y)) >> bits_of<T>);
   } else {
+#if defined(__CUDA_ARCH__)
+    if (!__builtin_is_constant_evaluated()) {
+      if constexpr (std::is_signed_v<T>) {
+        return __mul64hi(x, y);
+      } else {
+        return __umul64hi(x, y);
+      }
+    }
+#endif
     // Schoolbook on 32-bit digits; the upper digits keep the sign, and the shifts with it.
     const auto x_low = static_cast<std::uint64_t>(x) & 0xFFFFFFFFU;
     const auto y_low = static_cast<std::uint64_t>(y) & 0xFFFFFFFFU;
@@ -98,20 +117,23 @@ SYCL_EXTERNAL constexpr T multiply_add_saturated(T x, T y, T z) {
   if constexpr (sizeof(T) < 8) {
     const auto exact =
         static_cast<widest<T>>(x) * static_cast<widest<T>>(y) + static_cast<widest<T>>(z);
-    return exact > static_cast<widest<T>>(highest)  ? highest
-           : exact < static_cast<widest<T>>(lowest) ? lowest
-                                                    : static_cast<T>(exact);
+    if constexpr (std::is_signed_v<T>) {
+      if (exact < static_cast<widest<T>>(lowest)) {
+        return lowest;
+      }
+    }
+    return exact > static_cast<widest<T>>(highest) ? highest : static_cast<T>(exact);
   } else {
     // The 128-bit sum as two words; it fits if the upper one only extends the sign of the lower.
     const T low = wrapping_multiply(x, y);
     const T sum = wrapping_add(low, z);
     T high = multiply_high(x, y);
     if constexpr (std::is_signed_v<T>) {
-      high += z < 0 ? T(-1) : T(0);
+      high += is_negative(z) ? T(-1) : T(0);
     }
     high += static_cast<std::uint64_t>(sum) < static_cast<std::uint64_t>(low) ? T(1) : T(0);
-    const T fitting = std::is_signed_v<T> && sum < 0 ? static_cast<T>(-1) : T(0);
-    return high == fitting ? sum : (std::is_signed_v<T> && high < 0) ? lowest : highest;
+    const T fitting = is_negative(sum) ? static_cast<T>(-1) : T(0);
+    return high == fitting ? sum : is_negative(high) ? lowest : highest;
   }
 }
 
@@ -124,19 +146,37 @@ SYCL_EXTERNAL constexpr T rotate_left(T x, T y) {
   return shift == 0 ? x : static_cast<T>((value << shift) | (value >> (bits - shift)));
 }
 
+// The built-ins are those of the compiler for 32 and 64 bits, which nvcc has for GPUs as well,
+// apart from that for trailing zeros.
 template <typename T>
 SYCL_EXTERNAL constexpr T leading_zeros(T x) {
-  const std::uint64_t value = static_cast<unsigned_of<T>>(x);
-  return static_cast<T>(value == 0 ? bits_of<T> : __builtin_clzll(value) - (64 - bits_of<T>));
+  const auto value = static_cast<unsigned_of<T>>(x);
+  if (value == 0) {
+    return static_cast<T>(bits_of<T>);
+  }
+  if constexpr (sizeof(T) < 8) {
+    return static_cast<T>(__builtin_clz(value) - (32 - bits_of<T>));
+  } else {
+    return static_cast<T>(__builtin_clzll(value));
+  }
 }
 template <typename T>
 SYCL_EXTERNAL constexpr T trailing_zeros(T x) {
-  const std::uint64_t value = static_cast<unsigned_of<T>>(x);
-  return static_cast<T>(value == 0 ? bits_of<T> : __builtin_ctzll(value));
+  const wrapping<T> value = static_cast<unsigned_of<T>>(x);
+  if (value == 0) {
+    return static_cast<T>(bits_of<T>);
+  }
+  const auto lowest_one = static_cast<T>(value & (0 - value));
+  return static_cast<T>(bits_of<T> - 1 - leading_zeros(lowest_one));
 }
 template <typename T>
 SYCL_EXTERNAL constexpr T count_ones(T x) {
-  return static_cast<T>(__builtin_popcountll(static_cast<unsigned_of<T>>(x)));
+  const auto value = static_cast<unsigned_of<T>>(x);
+  if constexpr (sizeof(T) < 8) {
+    return static_cast<T>(__builtin_popcount(value));
+  } else {
+    return static_cast<T>(__builtin_popcountll(value));
+  }
 }
 
 // The integer of twice the width and the signedness of High.

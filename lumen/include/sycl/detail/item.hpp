@@ -38,10 +38,10 @@ class item : public detail::number_like<item<Dimensions, WithOffset>, Dimensions
     return item<Dimensions, true>(index_, sizes_, id<Dimensions>());
   }
 
-  friend bool operator==(const item& a, const item& b) {
+  SYCL_EXTERNAL friend bool operator==(const item& a, const item& b) {
     return a.index_ == b.index_ && a.sizes_ == b.sizes_ && a.offset_ == b.offset_;
   }
-  friend bool operator!=(const item& a, const item& b) { return !(a == b); }
+  SYCL_EXTERNAL friend bool operator!=(const item& a, const item& b) { return !(a == b); }
 
  private:
   friend struct detail::item_maker;

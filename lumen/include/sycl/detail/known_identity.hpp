@@ -38,7 +38,7 @@ LUMEN_IDENTITY(maximum, std::is_arithmetic_v<T>, lowest)
 #undef LUMEN_IDENTITY
 
 template <typename T>
-constexpr T identity_value(identity_kind kind) {
+SYCL_EXTERNAL constexpr T identity_value(identity_kind kind) {
   using limits = std::numeric_limits<T>;
   switch (kind) {
     case identity_kind::one:
@@ -71,7 +71,13 @@ struct known_identity {
   static constexpr T value = detail::identity_value<std::remove_cv_t<T>>(
       detail::identity_of<Op, std::remove_cv_t<T>>::kind);
 };
+// Kernels may pass it by reference, for which code for GPUs needs a copy in the device's memory.
+#if defined(__CUDA_ARCH__)
+template <typename Op, typename T>
+static __device__ constexpr T known_identity_v = known_identity<Op, T>::value;
+#else
 template <typename Op, typename T>
 inline constexpr T known_identity_v = known_identity<Op, T>::value;
+#endif
 
 LUMEN_NAMESPACE_END

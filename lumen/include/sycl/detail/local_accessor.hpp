@@ -74,7 +74,7 @@ class local_accessor {
 
  private:
   SYCL_EXTERNAL DataT* begin_address() const {
-    return reinterpret_cast<DataT*>(detail::local_memory_base + place_);
+    return reinterpret_cast<DataT*>(detail::local_memory() + place_);
   }
 
   range<Dimensions> range_;

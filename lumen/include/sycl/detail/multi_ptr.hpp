@@ -129,10 +129,10 @@ class multi_ptr {
         op reinterpret_cast<std::uintptr_t>(b.pointer_);                          \
   }                                                                               \
   SYCL_EXTERNAL friend bool operator op(const multi_ptr& a, std::nullptr_t) {     \
-    return reinterpret_cast<std::uintptr_t>(a.pointer_) op std::uintptr_t{0};     \
+    return a op multi_ptr(nullptr);                                               \
   }                                                                               \
   SYCL_EXTERNAL friend bool operator op(std::nullptr_t, const multi_ptr& b) {     \
-    return std::uintptr_t{0} op reinterpret_cast<std::uintptr_t>(b.pointer_);     \
+    return multi_ptr(nullptr) op b;                                               \
   }
   LUMEN_POINTER_COMPARE(==)
   LUMEN_POINTER_COMPARE(!=)

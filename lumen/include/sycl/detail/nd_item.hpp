@@ -78,10 +78,10 @@ class nd_item {
     (events.wait(), ...);
   }
 
-  friend bool operator==(const nd_item& a, const nd_item& b) {
+  SYCL_EXTERNAL friend bool operator==(const nd_item& a, const nd_item& b) {
     return a.get_nd_range() == b.get_nd_range() && a.get_global_id() == b.get_global_id();
   }
-  friend bool operator!=(const nd_item& a, const nd_item& b) { return !(a == b); }
+  SYCL_EXTERNAL friend bool operator!=(const nd_item& a, const nd_item& b) { return !(a == b); }
 
  private:
   friend struct detail::nd_item_maker;

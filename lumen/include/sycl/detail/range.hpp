@@ -221,8 +221,8 @@ class nd_range {
  public:
   static constexpr int dimensions = Dimensions;
 
-  nd_range(range<Dimensions> global, range<Dimensions> local,
-           id<Dimensions> offset = id<Dimensions>())
+  SYCL_EXTERNAL nd_range(range<Dimensions> global, range<Dimensions> local,
+                         id<Dimensions> offset = id<Dimensions>())
       : global_(global), local_(local), offset_(offset) {}
 
   SYCL_EXTERNAL range<Dimensions> get_global_range() const { return global_; }
@@ -230,10 +230,10 @@ class nd_range {
   SYCL_EXTERNAL range<Dimensions> get_group_range() const { return global_ / local_; }
   SYCL_EXTERNAL id<Dimensions> get_offset() const { return offset_; }
 
-  friend bool operator==(const nd_range& a, const nd_range& b) {
+  SYCL_EXTERNAL friend bool operator==(const nd_range& a, const nd_range& b) {
     return a.global_ == b.global_ && a.local_ == b.local_ && a.offset_ == b.offset_;
   }
-  friend bool operator!=(const nd_range& a, const nd_range& b) { return !(a == b); }
+  SYCL_EXTERNAL friend bool operator!=(const nd_range& a, const nd_range& b) { return !(a == b); }
 
  private:
   range<Dimensions> global_;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Scalar functions that the C library lacks, for float and double: multiples of pi, real powers
-// with a restricted domain, and roots. Error bounds are stated for each and tested.
+// with a restricted domain, and roots. Error bounds are stated for each and tested. What the math
+// library of CUDA has is taken from there in code for GPUs, with the bounds that its manual gives.
 #pragma once
 
 #include <cmath>
@@ -36,6 +37,9 @@ SYCL_EXTERNAL half_turns<T> split_half_turns(T x) {
 // sin(pi x), within 2 ulp; exact at integers and half-integers, with the sign of x at integers.
 template <typename T>
 SYCL_EXTERNAL T sin_pi(T x) {
+#if defined(__CUDA_ARCH__)
+  return ::sinpi(x);
+#else
   if (!std::isfinite(x)) {
     return not_a_number<T>;
   }
@@ -46,11 +50,15 @@ SYCL_EXTERNAL T sin_pi(T x) {
   const T angle = pi_of<T> * rest;
   const T size = quarter % 2 == 0 ? std::sin(angle) : std::cos(angle);
   return (quarter % 4 < 2) == !std::signbit(x) ? size : -size;
+#endif
 }
 
 // cos(pi x), within 2 ulp; exact at integers and half-integers, where the latter give +0.
 template <typename T>
 SYCL_EXTERNAL T cos_pi(T x) {
+#if defined(__CUDA_ARCH__)
+  return ::cospi(x);
+#else
   if (!std::isfinite(x)) {
     return not_a_number<T>;
   }
@@ -61,6 +69,38 @@ SYCL_EXTERNAL T cos_pi(T x) {
   const T angle = pi_of<T> * rest;
   const T size = quarter % 2 == 0 ? std::cos(angle) : std::sin(angle);
   return quarter == 1 || quarter == 2 ? -size : size;
+#endif
+}
+
+template <typename T>
+SYCL_EXTERNAL T power_of_ten(T x) {
+#if defined(__CUDA_ARCH__)
+  return ::exp10(x);
+#else
+  return std::pow(T(10), x);
+#endif
+}
+
+template <typename T>
+SYCL_EXTERNAL T reciprocal_root(T x) {
+#if defined(__CUDA_ARCH__)
+  return ::rsqrt(x);
+#else
+  return T(1) / std::sqrt(x);
+#endif
+}
+
+// sin(x), and cos(x) in *cosine.
+template <typename T>
+SYCL_EXTERNAL T sine_and_cosine(T x, T* cosine) {
+#if defined(__CUDA_ARCH__)
+  T sine;
+  ::sincos(x, &sine, cosine);
+  return sine;
+#else
+  *cosine = std::cos(x);
+  return std::sin(x);
+#endif
 }
 
 // x^y for x >= 0 only; NaN where the limit depends on the road (0^0, inf^0, 1^inf).
@@ -119,13 +159,32 @@ SYCL_EXTERNAL T of_lesser_size(T x, T y) {
   return a < b ? x : b < a ? y : std::fmin(x, y);
 }
 
+// The sign of gamma(x): that of the side from which x comes at zeros, 1 at the other poles and NaN.
+template <typename T>
+SYCL_EXTERNAL int sign_of_gamma(T x) {
+  const T below = std::floor(x);
+  const bool between_poles = x < 0 && below != x;
+  const bool negative = between_poles ? std::fmod(below, T(2)) != 0 : x == 0 && std::signbit(x);
+  return negative ? -1 : 1;
+}
+
 // ln |gamma(x)| and the sign of gamma(x). The plain lgamma of the C library writes a global
-// variable, which is a race between work-items.
+// variable, which is a race between work-items; that of CUDA gives no sign at all.
 SYCL_EXTERNAL inline float log_gamma(float x, int* sign) {
+#if defined(__CUDA_ARCH__)
+  *sign = sign_of_gamma(x);
+  return ::lgammaf(x);
+#else
   return ::lgammaf_r(x, sign);
+#endif
 }
 SYCL_EXTERNAL inline double log_gamma(double x, int* sign) {
+#if defined(__CUDA_ARCH__)
+  *sign = sign_of_gamma(x);
+  return ::lgamma(x);
+#else
   return ::lgamma_r(x, sign);
+#endif
 }
 template <typename T>
 SYCL_EXTERNAL T log_gamma(T x) {

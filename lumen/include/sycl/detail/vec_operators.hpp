@@ -11,8 +11,10 @@
 
 // Loops over the elements of a vec become straight code at any level of optimisation above none;
 // left to itself, GCC keeps them as loops over memory at -O2.
-#if defined(__clang__) || defined(__CUDACC__)
+#if defined(__clang__) || defined(__CUDA_ARCH__)
 #define LUMEN_UNROLL _Pragma("unroll")
+#elif defined(__CUDACC__)
+#define LUMEN_UNROLL  // The front end of nvcc refuses what the GCC behind it knows.
 #else
 #define LUMEN_UNROLL _Pragma("GCC unroll 16")
 #endif

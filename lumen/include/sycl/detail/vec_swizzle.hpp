@@ -21,13 +21,18 @@ template <typename Result, typename Source, int... Indexes>
 class swizzled_vec
     : public vec_elements<swizzled_vec<Result, Source, Indexes...>, sizeof...(Indexes)> {
   static constexpr int count = sizeof...(Indexes);
-  static constexpr int indexes[count] = {Indexes...};
   using T = typename Result::element_type;
+
+  // A table within a function: code for GPUs cannot reach static members.
+  SYCL_EXTERNAL static constexpr int place(int i) {
+    constexpr int indexes[count] = {Indexes...};
+    return indexes[i];
+  }
 
   static constexpr bool all_differ() {
     for (int i = 0; i < count; ++i) {
       for (int j = 0; j < i; ++j) {
-        if (indexes[i] == indexes[j]) {
+        if (place(i) == place(j)) {
           return false;
         }
       }
@@ -49,12 +54,12 @@ class swizzled_vec
 
   SYCL_EXTERNAL constexpr operator value() const { return get(); }
 
-  SYCL_EXTERNAL constexpr decltype(auto) operator[](int i) { return source_[indexes[i]]; }
-  SYCL_EXTERNAL constexpr T operator[](int i) const { return source_[indexes[i]]; }
+  SYCL_EXTERNAL constexpr decltype(auto) operator[](int i) { return source_[place(i)]; }
+  SYCL_EXTERNAL constexpr T operator[](int i) const { return source_[place(i)]; }
 
   template <int... Chosen>
   SYCL_EXTERNAL constexpr auto pick() const {
-    return swizzled_vec<vec<T, sizeof...(Chosen)>, Source, indexes[Chosen]...>(source_);
+    return swizzled_vec<vec<T, sizeof...(Chosen)>, Source, place(Chosen)...>(source_);
   }
 
   template <typename ConvertT, rounding_mode Mode = rounding_mode::automatic>
@@ -114,7 +119,7 @@ class swizzled_vec
 
   SYCL_EXTERNAL constexpr value get() const {
     if constexpr (count == 1) {
-      return source_[indexes[0]];
+      return source_[place(0)];
     } else {
       return Result(source_[Indexes]...);
     }
@@ -123,7 +128,7 @@ class swizzled_vec
   SYCL_EXTERNAL constexpr swizzled_vec& set(const Result& values) {
     static_assert(all_differ(), "an element that is named twice cannot be assigned");
     LUMEN_UNROLL for (int i = 0; i < count; ++i) {
-      source_[indexes[i]] = values[i];
+      source_[place(i)] = values[i];
     }
     return *this;
   }
