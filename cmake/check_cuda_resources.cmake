@@ -5,7 +5,8 @@
 # such a kernel spills or when one that should be there is missing for an architecture. A stack
 # frame without spills is shown only: it belongs to the reduction of angles far outside of what
 # these kernels compute.
-#   cmake -DLOGS=<folder of *.log> -DCXXFILT=<c++filt> -P cmake/check_cuda_resources.cmake
+#   cmake -DLOGS=<folder of *.log> -DCXXFILT=<c++filt> [-DARCHITECTURES=<list, such as 80;90>]
+#         -P cmake/check_cuda_resources.cmake
 cmake_minimum_required(VERSION 3.25)
 
 set(engines philox4x32x10 mrg32k3a mcg31m1 mcg59)
@@ -30,7 +31,7 @@ function(pad out text width)
   set(${out} "${text}" PARENT_SCOPE)
 endfunction()
 
-# take(): the kernel whose lines have all been read, if it is one of those.
+# take(): the kernel whose lines have all been read, if there is one and it is one of those.
 macro(take)
   string(REGEX REPLACE "(kestrel::tarn::rng|sycl)::([a-z]+_[0-9]+::)?(detail::)?" "" name "${kernel}")
   if(name MATCHES "engine_func(_sub_seq)?<([a-z0-9]+), [^<>]*gpu::([a-z0-9_]+)(<[^<>]*>), (.*)")
@@ -57,6 +58,7 @@ macro(take)
   endif()
 endmacro()
 
+set(kernel "")
 file(GLOB logs "${LOGS}/*.log")
 foreach(log IN LISTS logs)
   execute_process(COMMAND "${CXXFILT}" INPUT_FILE "${log}" OUTPUT_VARIABLE text
@@ -65,8 +67,11 @@ foreach(log IN LISTS logs)
   string(REPLACE "\n" ";" lines "${text}")
   foreach(line IN LISTS lines)
     if(line MATCHES "Compiling entry function '(.*)' for 'sm_([0-9a-z]+)'")
-      set(kernel "${CMAKE_MATCH_1}")
-      set(architecture "${CMAKE_MATCH_2}")
+      set(entry "${CMAKE_MATCH_1}")
+      set(next_architecture "${CMAKE_MATCH_2}")
+      take()  # that before: what it calls is told behind it
+      set(kernel "${entry}")
+      set(architecture "${next_architecture}")
       set(stack 0)
       set(spilled 0)
     elseif(line MATCHES "([0-9]+) bytes stack frame, ([0-9]+) bytes spill stores, ([0-9]+) bytes spill loads")
@@ -75,9 +80,10 @@ foreach(log IN LISTS logs)
       math(EXPR spilled "${spilled} + ${CMAKE_MATCH_2} + ${CMAKE_MATCH_3}")
     elseif(line MATCHES "Used ([0-9]+) registers")
       set(registers "${CMAKE_MATCH_1}")
-      take()
     endif()
   endforeach()
+  take()
+  set(kernel "")
 endforeach()
 
 if(NOT rows)
@@ -89,6 +95,9 @@ pad(header "kernel" 73)
 message("${header}for     registers  spilled  stack (bytes)\n${rows}")
 
 set(missing 0)
+if(ARCHITECTURES AND NOT ARCHITECTURES MATCHES "[a-z]")  # native and its kin are no numbers
+  list(APPEND architectures ${ARCHITECTURES})
+endif()
 list(REMOVE_DUPLICATES architectures)
 foreach(architecture IN LISTS architectures)
   foreach(engine IN LISTS engines)

@@ -62,6 +62,9 @@ bool is_accepted(const byte_vector& binary, const opencl_device& target) {
   cl_int status = CL_SUCCESS;
   const cl_program program = target.calls.clCreateProgramWithBinary(
       target.context, 1, &target.device, &size, &data, &binary_status, &status);
+  if (status != CL_SUCCESS && program != nullptr) {
+    target.calls.clReleaseProgram(program);
+  }
   if (program == nullptr || status != CL_SUCCESS) {
     return false;
   }

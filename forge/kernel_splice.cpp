@@ -62,7 +62,16 @@ binary_fault kernel_splice::plan(byte_view binary, byte_view code, byte_view pat
   }
   heap_size_ = static_cast<std::uint32_t>(heap);
   growth_ = heap - kernel_.header.kernel_heap_size + patches.size;
-  return binary_fault::none;
+  return section_can_grow() ? binary_fault::none : binary_fault::bad_program;
+}
+
+/// Whether the program section's size, which the file is free to choose, still holds the program
+/// header afterwards, and does not wrap.
+bool kernel_splice::section_can_grow() const {
+  const std::uint64_t after = program_.size + growth_;
+  const bool shrinks = growth_ >> 63 != 0;
+  return after >= sizeof(program_header) &&
+         (shrinks ? after < program_.size : after >= program_.size);
 }
 
 void kernel_splice::write(std::uint8_t* result) const {

@@ -28,6 +28,7 @@ class kernel_splice {
   void write_neutral(std::uint8_t* result) const;
 
  private:
+  bool section_can_grow() const;
   void copy_parts(std::uint8_t* result) const;
   void clear_tokens(std::uint8_t* result) const;
   void update_kernel(std::uint8_t* result) const;

@@ -76,7 +76,8 @@ binary_fault find_kernel(const elf_view& elf, const program_section& program,
   kernel.patches = kernel.states + header.general_state_size +
                    std::uint64_t{header.dynamic_state_size} + header.surface_state_size;
   kernel.end = kernel.patches + header.patch_list_size;
-  if (!bytes.holds(program.offset, program.size) || kernel.end - program.offset > program.size ||
+  // Only the file bounds the kernel: what sh_size says beyond the program header is not needed.
+  if (!bytes.holds(program.offset, kernel.end - program.offset) ||
       program.offset < sizeof(Elf64_Ehdr) || headers_overlap(elf, program.offset, kernel.end)) {
     return binary_fault::bad_program;
   }

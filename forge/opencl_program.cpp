@@ -51,16 +51,27 @@ std::vector<T> per_device(const opencl_calls& opencl, cl_program program, cl_pro
   return list;
 }
 
+// Numbers beyond these are a fault of the driver, and no memory is taken for them.
+constexpr cl_uint most_devices = 4096;
+constexpr std::size_t largest_binary = std::size_t{1} << 30;
+
 byte_vector program_binary(const opencl_calls& opencl, cl_program program, cl_device_id device) {
   cl_uint count = 0;
   check(opencl.clGetProgramInfo(program, CL_PROGRAM_NUM_DEVICES, sizeof count, &count, nullptr));
+  if (count > most_devices) {
+    throw opencl_error(CL_INVALID_VALUE);
+  }
   const auto devices = per_device<cl_device_id>(opencl, program, CL_PROGRAM_DEVICES, count);
   const auto found = std::find(devices.begin(), devices.end(), device);
   if (found == devices.end()) {
     throw opencl_error(CL_INVALID_VALUE);
   }
   const auto at = static_cast<std::size_t>(found - devices.begin());
-  byte_vector binary(per_device<std::size_t>(opencl, program, CL_PROGRAM_BINARY_SIZES, count)[at]);
+  const auto sizes = per_device<std::size_t>(opencl, program, CL_PROGRAM_BINARY_SIZES, count);
+  if (sizes[at] > largest_binary) {
+    throw opencl_error(CL_INVALID_VALUE);
+  }
+  byte_vector binary(sizes[at]);
   // The binaries of devices with a null pointer are left out.
   std::vector<unsigned char*> places(count);
   places[at] = binary.data();

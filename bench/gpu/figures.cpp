@@ -40,11 +40,8 @@ bool figures::ReportContext(const Context&) {
 void figures::ReportRuns(const std::vector<Run>& runs) {
   for (const Run& run : runs) {
     const std::string& name = run.run_name.function_name;
-    if (run.error_occurred) {
-      if (failed_.insert(name).second)  // the same in every repetition
-        std::fprintf(stderr, "%s: %s\n", name.c_str(), run.error_message.c_str());
-      continue;
-    }
+    if (run.error_occurred)
+      continue;  // the road has said it
     const auto rate = run.counters.find("items_per_second");
     if (rate == run.counters.end())
       continue;

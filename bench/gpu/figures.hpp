@@ -5,7 +5,6 @@
 
 #include <cstddef>
 #include <map>
-#include <set>
 #include <string>
 #include <vector>
 
@@ -38,9 +37,6 @@ class figures : public benchmark::BenchmarkReporter {
   void print(const row& of) const;
   static void print_heading();
 
-  /// Whether anything was refused or drew wrong values; the reasons were printed.
-  bool failed() const { return !failed_.empty(); }
-
  private:
   struct figure {
     double rate;  // median, values per second
@@ -52,7 +48,6 @@ class figures : public benchmark::BenchmarkReporter {
   const figure* fastest(const std::vector<std::string>& names) const;
 
   std::map<std::string, figure> figures_;
-  std::set<std::string> failed_;
 };
 
 }  // namespace gpu_bench

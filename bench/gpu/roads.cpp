@@ -3,7 +3,10 @@
 #include "roads.hpp"
 
 #include <algorithm>
+#include <cstdio>
+#include <memory>
 #include <stdexcept>
+#include <string>
 #include <vector>
 
 #include <benchmark/benchmark.h>
@@ -28,13 +31,25 @@ void check_road(const road& way, filler& filled_by) {
   way.check(drawn.data());
 }
 
-void run(benchmark::State& state, const road& way, bool& checked) {
+// What the repetitions of one road know of each other.
+struct road_state {
+  bool checked = false;
+  std::string failure;
+};
+
+bool any_failed = false;
+
+void run(benchmark::State& state, const road& way, road_state& known) {
+  if (!known.failure.empty()) {
+    state.SkipWithError(known.failure.c_str());
+    return;
+  }
   const auto n = static_cast<std::int64_t>(way.n);
   try {
     const std::unique_ptr<filler> made = way.make();
-    if (!checked)
+    if (!known.checked)
       check_road(way, *made);
-    checked = true;
+    known.checked = true;
     for (auto _ : state) {
       const timing timed = time_calls(*made, static_cast<int>(values_behind_each_other / n));
       state.SetIterationTime(timed.device);
@@ -43,17 +58,24 @@ void run(benchmark::State& state, const road& way, bool& checked) {
     state.SetItemsProcessed(n);
     state.SetBytesProcessed(n * static_cast<std::int64_t>(way.value_bytes));
   } catch (const std::exception& error) {
+    known.failure = error.what();
+    any_failed = true;
+    // Here, since the table shows what the other repetitions made of it.
+    std::fprintf(stderr, "%s: %s\n", way.name.c_str(), error.what());
     state.SkipWithError(error.what());
   }
 }
 
 }  // namespace
 
+bool any_road_failed() {
+  return any_failed;
+}
+
 void add_road(const road& added) {
-  const auto checked = std::make_shared<bool>(false);
+  const auto known = std::make_shared<road_state>();
   auto* registered = benchmark::RegisterBenchmark(
-      added.name.c_str(),
-      [added, checked](benchmark::State& state) { run(state, added, *checked); });
+      added.name.c_str(), [added, known](benchmark::State& state) { run(state, added, *known); });
   registered->UseManualTime()->Iterations(1)->Repetitions(repetitions);
   take_quartiles(registered);
 }

@@ -32,4 +32,7 @@ struct road {
 /// Registers the road: 21 repetitions of one timing each.
 void add_road(const road& added);
 
+/// Whether anything was refused or drew wrong values, in any repetition; the reasons were printed.
+bool any_road_failed();
+
 }  // namespace gpu_bench

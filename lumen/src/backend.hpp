@@ -41,6 +41,8 @@ class command_stream {
 
   // Commands that go in from now on come after a mark of a stream of the same driver.
   virtual void wait_for(stream_mark& mark) = 0;
+  // Waits for all that went in, whatever becomes of it.
+  virtual void drain() noexcept = 0;
   // Null where every command is done when its call returns.
   virtual std::shared_ptr<stream_mark> mark() = 0;
 };

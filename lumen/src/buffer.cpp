@@ -76,30 +76,31 @@ task_ref access_record::unfinished() const {
 
 buffer_core::buffer_core(std::size_t bytes)
     : bytes_(bytes), record_(std::make_unique<access_record>()) {}
-buffer_core::~buffer_core() {
-  delete copies_.load(std::memory_order_acquire);
+buffer_core::~buffer_core() = default;
+
+buffer_copies* buffer_core::made_copies() const {
+  const std::lock_guard<std::mutex> lock(copies_mutex_);
+  return copies_.get();
 }
 
 void buffer_core::to_host(access_kind use) {
-  if (buffer_copies* const made = copies_.load(std::memory_order_acquire)) {
+  if (buffer_copies* const made = made_copies()) {
     made->to_host(use);
   }
 }
 
 void* buffer_core::address_on(const device_record& device) {
-  buffer_copies* made = copies_.load(std::memory_order_acquire);
-  if (made == nullptr) {
-    auto fresh =
-        std::make_unique<buffer_copies>(data_, bytes_, defined_.load(std::memory_order_relaxed));
-    if (copies_.compare_exchange_strong(made, fresh.get(), std::memory_order_acq_rel)) {
-      made = fresh.release();
+  {
+    const std::lock_guard<std::mutex> lock(copies_mutex_);
+    if (!copies_) {
+      copies_ = std::make_unique<buffer_copies>(data_, bytes_, defined_.load());
     }
   }
-  return made->address_on(device);
+  return copies_->address_on(device);
 }
 
 void* buffer_core::host_address(const device_record& device, void* address) {
-  buffer_copies* const made = copies_.load(std::memory_order_acquire);
+  buffer_copies* const made = made_copies();
   return made == nullptr ? address : made->host_address(device, address);
 }
 

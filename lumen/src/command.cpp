@@ -15,6 +15,9 @@ command::~command() = default;
 host_command::~host_command() = default;
 device_command::~device_command() = default;
 void device_command::finish() {}
+bool device_command::ends_on_host() const {
+  return false;
+}
 kernel_command::~kernel_command() = default;
 void kernel_command::enqueue(command_stream& stream, const launch_shape& shape) {
   stream.launch(shape, *this);

@@ -8,6 +8,7 @@
 #include <new>
 #include <system_error>
 #include <thread>
+#include <unistd.h>
 
 LUMEN_NAMESPACE_BEGIN
 namespace detail {
@@ -35,26 +36,6 @@ class busy_queues {
   int count_ = 0;
 };
 
-// Ends the tasks that their streams have done and takes them out of the list, whose last link comes
-// back. `any` tells whether there were such.
-task** sweep(task*& first, bool& any) {
-  busy_queues busy;
-  task** link = &first;
-  while (*link != nullptr) {
-    task& each = **link;
-    const queue_core* const owner = each.queue().get();
-    if (!each.done() && (busy.has(owner) || !each.reached())) {
-      busy.add(owner);
-      link = &each.ready_next;
-      continue;
-    }
-    *link = each.ready_next;
-    each.finish_issued();
-    each.release();
-    any = true;
-  }
-  return link;
-}
 }  // namespace
 
 completer& completer::instance() {
@@ -66,43 +47,103 @@ void completer::add(task& issued) {
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     try {
-      if (!started_) {
-        std::thread([this] { work(); }).detach();
-        started_ = true;
+      if (process_ != getpid()) {
+        std::thread worker([this] { work(); });
+        process_ = getpid();
+        thread_ = worker.get_id();
+        worker.detach();
       }
     } catch (const std::bad_alloc&) {
     } catch (const std::system_error&) {
     }
-    if (started_) {
+    if (process_ == getpid()) {
       issued.retain();
-      issued.ready_next = nullptr;
-      (first_ != nullptr ? last_->ready_next : first_) = &issued;
-      last_ = &issued;
-      sleep_.notify_one();
+      put_back(issued);
+      come_.notify_one();
       return;
     }
   }
-  issued.finish_issued();
+  issued.wait();
+}
+
+void completer::put_back(task& open) {
+  open.ready_next = nullptr;
+  (first_ != nullptr ? last_->ready_next : first_) = &open;
+  last_ = &open;
+  ++count_;
+}
+
+// The first of the list, or null.
+task* completer::take() {
+  task* const taken = first_;
+  if (taken != nullptr) {
+    first_ = taken->ready_next;
+    --count_;
+  }
+  return taken;
+}
+
+void completer::put_down() {
+  holds_ = false;
+  put_down_.notify_all();
+}
+
+// Looks at each task once and ends those that their streams have done. Returns whether there were
+// such.
+bool completer::sweep() {
+  busy_queues busy;
+  bool any = false;
+  std::unique_lock<std::mutex> lock(mutex_);
+  for (std::size_t left = count_; left > 0; --left) {
+    task* const each = take();
+    if (each == nullptr) {
+      break;
+    }
+    holds_ = true;
+    lock.unlock();
+    const queue_core* const owner = each->queue().get();
+    const bool open = !each->done() && (busy.has(owner) || !each->reached());
+    if (open) {
+      busy.add(owner);
+    } else {
+      each->wait();
+      each->release();
+      any = true;
+    }
+    lock.lock();
+    if (open) {
+      put_back(*each);
+    }
+    put_down();
+  }
+  return any;
 }
 
 void completer::work() {
-  task* mine = nullptr;
-  task** end = &mine;
   std::chrono::microseconds nap = shortest_nap;
   for (;;) {
     {
       std::unique_lock<std::mutex> lock(mutex_);
-      if (mine == nullptr) {
-        sleep_.wait(lock, [this] { return first_ != nullptr; });
-      }
-      *end = first_;
-      first_ = last_ = nullptr;
+      come_.wait(lock, [this] { return first_ != nullptr; });
     }
-    bool any = false;
-    end = sweep(mine, any);
-    nap = any ? shortest_nap : std::min(2 * nap, longest_nap);
-    if (mine != nullptr) {
-      std::this_thread::sleep_for(nap);
+    nap = sweep() ? shortest_nap : std::min(2 * nap, longest_nap);
+    std::this_thread::sleep_for(nap);
+  }
+}
+
+void completer::end_all() {
+  std::unique_lock<std::mutex> lock(mutex_);
+  const bool self = std::this_thread::get_id() == thread_;
+  for (;;) {
+    if (task* const each = take()) {
+      lock.unlock();
+      each->wait();
+      each->release();
+      lock.lock();
+    } else if (holds_ && !self) {
+      put_down_.wait(lock);
+    } else {
+      return;
     }
   }
 }

@@ -5,7 +5,11 @@
 #pragma once
 
 #include <condition_variable>
+#include <cstddef>
 #include <mutex>
+#include <thread>
+
+#include <sys/types.h>
 
 #include "task.hpp"
 
@@ -18,16 +22,27 @@ class completer {
   static completer& instance();
   // Needs no memory. Where there is no thread to be had, the task is waited for at once.
   void add(task& issued);
+  // For the end of the process: ends all tasks on the calling thread. On return no other thread
+  // touches one.
+  void end_all();
 
  private:
   void work();
+  bool sweep();
+  task* take();
+  void put_back(task& open);
+  void put_down();
 
   std::mutex mutex_;
-  std::condition_variable sleep_;
-  // Tasks that came since the thread looked last, linked by ready_next; each is retained.
+  std::condition_variable come_;
+  std::condition_variable put_down_;
+  // Linked by ready_next; each is retained.
   task* first_ = nullptr;
   task* last_ = nullptr;
-  bool started_ = false;
+  std::size_t count_ = 0;
+  bool holds_ = false;  // the thread has one of them in its hands
+  pid_t process_ = 0;   // where the thread is: a child made by fork has none of its own yet
+  std::thread::id thread_;
 };
 
 }  // namespace detail

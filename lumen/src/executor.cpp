@@ -13,6 +13,7 @@
 
 #include <sys/prctl.h>
 
+#include "completer.hpp"
 #include "settings.hpp"
 
 LUMEN_NAMESPACE_BEGIN
@@ -245,12 +246,25 @@ void executor::stop() {
       unlink(next);
       run_claimed(next, lock);
     } else if (running_ > mine && process_ == getpid()) {
-      milestones_.wait(lock);
+      // Issued tasks are ended here: the thread that looks after them may be the one that ends the
+      // process. More of them may come without a milestone.
+      lock.unlock();
+      completer::instance().end_all();
+      lock.lock();
+      if (first_ready_ == nullptr && running_ > mine) {
+        milestones_.wait_for(lock, std::chrono::milliseconds(1));
+      }
     } else {
       break;
     }
   }
   stopped_ = true;
+  if (process_ == getpid()) {
+    // Nobody touches a device from now on.
+    lock.unlock();
+    completer::instance().end_all();
+    lock.lock();
+  }
   sleepers_.notify_all();
   lock.unlock();
   for (std::thread& thread : threads_) {

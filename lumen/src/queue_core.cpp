@@ -45,6 +45,7 @@ void queue_core::add(task& added) {
   if (in_order && last_ != nullptr) {
     added.depend_on(*last_);
   }
+  added.in_queue = true;
   added.queue_previous = last_;
   (last_ != nullptr ? last_->queue_next : first_) = &added;
   last_ = &added;

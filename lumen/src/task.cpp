@@ -45,9 +45,21 @@ void task_ref::release() noexcept {
   task_->release();
 }
 
+namespace {
+// What uses the host's memory of a buffer has to find it current when it begins.
+bool goes_through_stream(work_kind kind, const queue_core* queue,
+                         const std::vector<access_request>& accesses) {
+  return kind == work_kind::device && queue != nullptr && queue->record.detached &&
+         std::none_of(accesses.begin(), accesses.end(),
+                      [](const access_request& access) { return access.place == nullptr; });
+}
+}  // namespace
+
 task::task(std::shared_ptr<queue_core> queue, command_group&& group)
     : queue_(std::move(queue)),
       kind_(group.kind),
+      streamed_(goes_through_stream(kind_, queue_.get(), group.accesses)),
+      ends_on_host_(streamed_ && static_cast<device_command&>(*group.work).ends_on_host()),
       shape_(group.shape),
       work_(std::move(group.work)),
       accesses_(std::move(group.accesses)) {}
@@ -83,20 +95,15 @@ void task::finish_linking() {
 }
 
 void task::abandon() noexcept {
-  kind_ = work_kind::none;
   work_.reset();
-  queue_.reset();
+  accesses_.clear();
   finish_linking();
-}
-
-// Whether the work goes through a stream while the host goes on.
-bool task::streamed() const noexcept {
-  return kind_ == work_kind::device && queue_ && queue_->record.detached;
 }
 
 // Whether the device itself keeps this task behind the other.
 bool task::follows(const task& other) const noexcept {
-  return streamed() && other.streamed() && queue_->record.driver == other.queue_->record.driver;
+  return streamed_ && other.streamed_ && !other.ends_on_host_ &&
+         queue_->record.driver == other.queue_->record.driver;
 }
 
 void task::dependency_done() {
@@ -107,7 +114,7 @@ void task::dependency_done() {
   // Where a long chain becomes ready at once the rest of it goes through the ready list.
   static thread_local unsigned chained = 0;
   constexpr unsigned longest_chain = 32;
-  if (streamed() && chained < longest_chain) {
+  if (streamed_ && chained < longest_chain) {
     ++chained;
     executor::instance().run_now(*this);
     --chained;
@@ -217,11 +224,13 @@ void task::wait() {
       if (threads.claim(now)) {
         now.run();
       }
-    } else if (its == task_state::issued && now.finish_issued()) {
-      continue;
-    } else if (task_ref next = its == task_state::pending ? now.open_dependency() : task_ref()) {
+    } else if (task_ref next = its == task_state::pending  ? now.open_dependency()
+                               : its == task_state::issued ? now.issued_before()
+                                                           : task_ref()) {
       keep_if_possible(path, std::move(last));
       last = std::move(next);
+    } else if (its == task_state::issued && now.finish_issued()) {
+      continue;
     } else if (++spins < spins_before_sleep) {
       relax();
     } else {
@@ -236,21 +245,21 @@ void task::execute() {
       access.core->to_host({access.writes, access.keeps});
     }
   }
-  if (kind_ == work_kind::host) {
-    static_cast<host_command&>(*work_).run(
-        interop_handle(queue_ ? queue_->dev.get_backend() : backend::host));
-  } else if (streamed()) {
+  if (streamed_) {
     const std::lock_guard<std::mutex> lock(queue_->issue_mutex);
     try {
       issue();
     } catch (...) {
       // What went in before the failure uses what the task is about to give back.
       end_mark_.reset();
-      if (const auto rest = queue_->stream->mark()) {
-        rest->wait();
-      }
+      queue_->stream->drain();
       throw;
     }
+  } else if (work_ == nullptr) {
+    return;
+  } else if (kind_ == work_kind::host) {
+    static_cast<host_command&>(*work_).run(
+        interop_handle(queue_ ? queue_->dev.get_backend() : backend::host));
   } else if (kind_ == work_kind::device) {
     static_cast<device_command&>(*work_).enqueue(*queue_->stream, shape_);
   }
@@ -271,7 +280,9 @@ void task::issue() {
   if (queue_->profiling) {
     begin_mark_ = stream.mark();
   }
-  static_cast<device_command&>(*work_).enqueue(stream, shape_);
+  if (work_ != nullptr) {
+    static_cast<device_command&>(*work_).enqueue(stream, shape_);
+  }
   end_mark_ = stream.mark();
 }
 
@@ -304,7 +315,7 @@ void task::issued() {
     set_state(task_state::issued);
   }
   if (executor::instance().stopped()) {
-    finish_issued();  // the process ends: nobody looks later
+    wait();  // the process ends: nobody looks later
   } else {
     completer::instance().add(*this);
   }
@@ -315,6 +326,16 @@ void task::issued() {
 
 bool task::reached() const noexcept {
   return end_mark_->reached();
+}
+
+task_ref task::issued_before() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  // One that this thread is about to end, in whose handler it waits here, is as good as done.
+  const auto found =
+      std::find_if(dependencies_.begin(), dependencies_.end(), [](const task_ref& dependency) {
+        return dependency->state() == task_state::issued && !dependency->runs_on_this_thread();
+      });
+  return found == dependencies_.end() ? task_ref() : *found;
 }
 
 bool task::finish_issued() {
@@ -348,7 +369,7 @@ void task::finish(std::exception_ptr error) {
   running_frame frame{this, innermost, false};
   innermost = &frame;
   try {
-    if (!error && kind_ == work_kind::device) {
+    if (!error && kind_ == work_kind::device && work_ != nullptr) {
       static_cast<device_command&>(*work_).finish();
     }
     if (queue_ && queue_->profiling) {
@@ -365,7 +386,7 @@ void task::finish(std::exception_ptr error) {
   work_.reset();
   accesses_.clear();
   innermost = frame.outer;
-  if (queue_) {
+  if (in_queue) {
     queue_->remove(*this);
   }
   std::vector<task_ref> successors;

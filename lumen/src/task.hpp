@@ -43,7 +43,7 @@ class task {
   void depend_on(task& other);
   void finish_linking();
   // In place of finish_linking, when linking failed before the queue knew of the task: it does
-  // nothing, and goes when what it depends on so far is done.
+  // nothing, but comes after all that it depends on so far, since others may come after it.
   void abandon() noexcept;
 
   task_state state() const noexcept {
@@ -57,8 +57,10 @@ class task {
   // Whether the stream has done an issued task.
   bool reached() const noexcept;
   // Waits until the stream has done an issued task, and ends the task unless another thread is at
-  // it: false then.
+  // it: false then. Those that it follows have to be done.
   bool finish_issued();
+  // One that an issued task follows and that is not done, although its work is where this one's is.
+  task_ref issued_before();
   // True while the calling thread is inside run() of this task.
   bool runs_on_this_thread() const noexcept;
   // How many tasks the calling thread is inside of.
@@ -81,6 +83,7 @@ class task {
   task* ready_previous = nullptr;
   std::uint64_t ticket = 0;
   // Links of the queue's list of unfinished tasks, guarded by the queue.
+  bool in_queue = false;
   task* queue_next = nullptr;
   task* queue_previous = nullptr;
 
@@ -90,7 +93,6 @@ class task {
   static constexpr std::uint32_t waited_bit = 8;
   static constexpr std::uint32_t linked_bit = 16;
 
-  bool streamed() const noexcept;
   bool follows(const task& other) const noexcept;
   void execute();
   void issue();
@@ -109,7 +111,9 @@ class task {
   // Unfinished dependencies, plus one while linking.
   std::atomic<std::uint32_t> unmet_{1};
   std::shared_ptr<queue_core> queue_;
-  work_kind kind_;
+  const work_kind kind_;
+  const bool streamed_;      // the work goes through a stream while the host goes on
+  const bool ends_on_host_;  // not all of it
   launch_shape shape_;
   std::unique_ptr<command> work_;
   std::vector<access_request> accesses_;  // keep the memory of buffers

@@ -37,9 +37,12 @@ TEST(devices, host_comes_first_and_virtual_ones_in_their_order) {
   EXPECT_EQ(sycl::platform::get_platforms().size(), devices.size() == 4 ? 2U : 3U);
 }
 
-TEST(devices, default_is_the_host_and_selectors_find_the_others) {
-  EXPECT_TRUE(sycl::device().is_cpu());
-  EXPECT_TRUE(sycl::queue().get_device().is_cpu());
+TEST(devices, default_is_a_cuda_device_or_the_host_and_selectors_find_the_others) {
+  const auto usual =
+      sycl::device::get_devices().size() == 4 ? sycl::backend::host : sycl::backend::cuda;
+  EXPECT_EQ(sycl::device().get_backend(), usual);
+  EXPECT_EQ(sycl::device().is_cpu(), usual == sycl::backend::host);
+  EXPECT_EQ(sycl::queue().get_device(), sycl::device());
   EXPECT_TRUE(sycl::device(sycl::cpu_selector_v).is_cpu());
   EXPECT_TRUE(sycl::device(sycl::gpu_selector_v).is_gpu());
   EXPECT_TRUE(sycl::queue(sycl::accelerator_selector_v).get_device().is_accelerator());

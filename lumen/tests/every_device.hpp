@@ -67,6 +67,19 @@ inline bool has_own_memory(const sycl::device& device) {
     }                                                                \
   }
 
+// A handler that appends the texts of asynchronous errors.
+inline sycl::async_handler appends_to(std::vector<std::string>& texts) {
+  return [&texts](sycl::exception_list errors) {
+    for (const std::exception_ptr& error : errors) {
+      try {
+        std::rethrow_exception(error);
+      } catch (const std::exception& known) {
+        texts.push_back(known.what());
+      }
+    }
+  };
+}
+
 // The error code of the sycl::exception that a call throws; success when it throws none.
 template <typename Call>
 sycl::errc code_of(const Call& call) {

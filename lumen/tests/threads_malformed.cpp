@@ -10,7 +10,7 @@
 
 TEST(malformed_number_of_threads, is_reported_once_and_the_default_is_used) {
   testing::internal::CaptureStderr();
-  sycl::queue q;
+  sycl::queue q(sycl::cpu_selector_v);
   const auto units = q.get_device().get_info<sycl::info::device::max_compute_units>();
   EXPECT_EQ(units, std::max(1U, std::thread::hardware_concurrency()));
   int value = 0;

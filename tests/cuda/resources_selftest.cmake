@@ -11,14 +11,20 @@ set(functors uniform_std exponential_icdf weibull_icdf rayleigh_icdf gumbel_icdf
     lognormal_box_muller2 bernoulli_icdf geometric_icdf)
 set(accessor "sycl::lumen_1::accessor<float, 1, (sycl::lumen_1::access_mode)1, (sycl::lumen_1::target)0, (sycl::lumen_1::access::placeholder)0>")
 
-# What ptxas says of a kernel, whose name may be mangled.
+# What ptxas says of a kernel, whose name may be mangled, and behind it of a function that it calls.
 function(kernel_lines out name architecture properties)
+  set(called "")
+  if(ARGC GREATER 4)
+    set(called "ptxas info    : Function properties for __internal_trig_reduction_slowpathd
+    ${ARGV4}
+")
+  endif()
   set(${out} "ptxas info    : Compiling entry function '${name}' for '${architecture}'
 ptxas info    : Function properties for ${name}
     ${properties}
 ptxas info    : Used 24 registers, used 0 barriers, 412 bytes cmem[0]
 ptxas info    : Compile time = 1.002 ms
-" PARENT_SCOPE)
+${called}" PARENT_SCOPE)
 endfunction()
 
 # write_log(ENGINE LEFT_OUT): a log of all kernels of an engine, for both architectures.
@@ -69,9 +75,8 @@ expect("all in registers" TRUE "mcg59 gaussian_box_muller2<float> pointer sm_90 
 expect("both forms" TRUE "mcg59 gaussian_box_muller2<float> accessor sm_80 24 0 0")
 
 # Stack frames pass; what a called function needs counts with its kernel.
-kernel_lines(lines ${mangled} sm_90 "32 bytes stack frame, 0 bytes spill stores, 0 bytes spill loads
-ptxas info    : Function properties for __internal_trig_reduction_slowpathd
-    40 bytes stack frame, 0 bytes spill stores, 0 bytes spill loads")
+kernel_lines(lines ${mangled} sm_90 "32 bytes stack frame, 0 bytes spill stores, 0 bytes spill loads"
+             "40 bytes stack frame, 0 bytes spill stores, 0 bytes spill loads")
 file(APPEND "${FIXTURE}/other.log" "${lines}")
 expect("stack frames" TRUE "philox4x32x10 uniform_std<float, float> pointer sm_90 24 0 72")
 
@@ -82,6 +87,19 @@ foreach(spill "12 bytes spill stores, 0" "0 bytes spill stores, 12")
   expect("spilled" FALSE "1 kernels spill, 0 are missing")
   expect("spilled" FALSE "philox4x32x10 uniform_std<float, float> pointer sm_90 24 12 0")
 endforeach()
+
+# In a called function, of a kernel with others behind it and of the last one.
+foreach(log a_first.log z_last.log)
+  write_logs()
+  kernel_lines(lines ${mangled} sm_90 "0 bytes stack frame, 0 bytes spill stores, 0 bytes spill loads"
+               "40 bytes stack frame, 4 bytes spill stores, 8 bytes spill loads")
+  file(WRITE "${FIXTURE}/${log}" "${lines}")
+  expect("called function spills" FALSE "1 kernels spill, 0 are missing")
+endforeach()
+write_logs()
+file(READ "${FIXTURE}/philox4x32x10_gpu.log" others)
+file(WRITE "${FIXTURE}/philox4x32x10_gpu.log" "${lines}${others}")
+expect("called function spills" FALSE "1 kernels spill, 0 are missing")
 
 # Of kernels that reject, or of engines with state on the device, nothing is asked.
 write_logs()

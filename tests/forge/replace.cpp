@@ -197,24 +197,37 @@ TEST(ReplaceKernel, TheKernelMayReachTheEndOfTheFileAndNoFurther) {
   EXPECT_THROW(replace_kernel(file, byte_vector{}, byte_vector{}), crate::bad_binary_section);
 }
 
-TEST(ReplaceKernel, TheKernelLiesInItsSectionAndTheSectionInTheFile) {
+// What the section header says of the size decides nothing but whether it can be kept right.
+TEST(ReplaceKernel, TheFileAloneBoundsTheKernel) {
   const older_kernel kernel = full_kernel();
   const byte_vector whole = older_binary(kernel);
   const std::size_t size_at = section_at(whole, index_of_program) + at_sh_size;
   const std::uint64_t kernel_size = program_data(kernel).size() - kernel.more.size();
   const std::uint64_t to_the_end = whole.size() - data_at(whole, index_of_program);
-  for (const std::uint64_t size : {kernel_size, to_the_end}) {
-    byte_vector file = whole;
-    put64(file, size_at, size);
-    EXPECT_NO_THROW(replace_kernel(file, byte_view(), byte_view())) << size;
-  }
+  const byte_vector code(kernel.kernel_heap.size());  // the heap grows by the room behind it
   for (const std::uint64_t size :
-       {std::uint64_t{28}, kernel_size - 1, to_the_end + 1, ~std::uint64_t{0} - 499}) {
+       {std::uint64_t{28}, kernel_size - 1, kernel_size, to_the_end, to_the_end + 1}) {
     byte_vector file = whole;
     put64(file, size_at, size);
-    expect_hw(file, 4, 4, 6);
-    EXPECT_THROW(replace_kernel(file, byte_view(), byte_view()), crate::bad_binary_section) << size;
+    const byte_vector result = replace_kernel(file, code, byte_view());
+    EXPECT_EQ(get64(result, size_at) - size, result.size() - file.size()) << size;
   }
+  byte_vector file = whole;
+  put64(file, size_at, ~std::uint64_t{0} - 1);  // would wrap
+  expect_hw(file, 4, 4, 6);
+  EXPECT_THROW(replace_kernel(file, code, byte_view()), crate::bad_binary_section);
+}
+
+TEST(ReplaceKernel, ASectionThatWouldShrinkBelowItsHeader) {
+  older_kernel kernel;
+  kernel.kernel_heap = byte_vector(1024);
+  byte_vector file = older_binary(kernel);
+  const std::size_t size_at = section_at(file, index_of_program) + at_sh_size;
+  const std::uint64_t shrinks_by = 1024 - 256;
+  put64(file, size_at, 28 + shrinks_by);
+  EXPECT_EQ(get64(replace_kernel(file, byte_view(), byte_view()), size_at), 28U);
+  put64(file, size_at, 28 + shrinks_by - 1);
+  EXPECT_THROW(replace_kernel(file, byte_view(), byte_view()), crate::bad_binary_section);
 }
 
 TEST(ReplaceKernel, AKernelHeaderBeyondTheFile) {

@@ -153,11 +153,11 @@ TEST(mrg32k3a_modes, copies_wait_for_the_last_call) {
   mrg32k3a source(queue, 7, custom(7));
   mrg32k3a_round model({7}, 7);
   tarn_test::gate shut(queue);
-  std::vector<double> values(100);
-  rng::generate(reals, source, 100, values.data(), {shut.closed});
+  tarn_test::results<double> values(queue, 100);
+  rng::generate(reals, source, 100, values.get(), {shut.closed});
   std::unique_ptr<mrg32k3a> copy;
   shut.open_during([&] { copy = std::make_unique<mrg32k3a>(source); });
-  EXPECT_EQ(values, model.draw(reals, 100));
+  EXPECT_EQ(values.values(), model.draw(reals, 100));
   EXPECT_EQ(draw(reals, *copy, 30), model.draw(reals, 30));
 }
 
@@ -185,14 +185,15 @@ void expect_kernel(mrg32k3a& engine, bool there) {
       there ? "[nothing raised]"
             : "kestrel::tarn::rng::generate: invalid argument: mrg32k3a with optimal/custom modes "
               "doesn't support this distribution";
-  std::vector<T> values(16, tarn_test::marker<T>());
-  sycl::buffer<T, 1> buffer{sycl::range<1>(values.size())};
+  constexpr std::size_t room = 16;
+  const tarn_test::results<T> values(engine.get_queue(), room);
+  sycl::buffer<T, 1> buffer{sycl::range<1>(room)};
   EXPECT_EQ(message_of<tarn::invalid_argument>(
-                [&] { rng::generate(distr, engine, n, values.data()).wait(); }),
+                [&] { rng::generate(distr, engine, n, values.get()).wait(); }),
             expected);
   EXPECT_EQ(message_of<tarn::invalid_argument>([&] { rng::generate(distr, engine, n, buffer); }),
             expected);
-  EXPECT_EQ(tarn_test::same_bits(values[0], tarn_test::marker<T>()), !there);
+  EXPECT_EQ(tarn_test::same_bits(*values.get(), tarn_test::marker<T>()), !there);
 }
 
 TEST(mrg32k3a_modes, have_kernels_of_uniform_and_gaussian_alone) {
@@ -327,5 +328,7 @@ TEST_F(level, copies_and_skips) {
             "parallelization");
   expect_and_delete(engine, model);
 }
+
+TARN_REPORTS_CUDA(mrg32k3a_modes)
 
 }  // namespace

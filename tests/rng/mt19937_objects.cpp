@@ -281,4 +281,6 @@ TEST(mt19937_calls, two_hundred_in_flight_give_consecutive_stretches) {
   EXPECT_TRUE(drawn.values() == serial(0, calls * n));
 }
 
+TARN_REPORTS_CUDA(mt19937_objects)
+
 }  // namespace

@@ -347,4 +347,6 @@ TEST(mt2203_level, goes_on_from_a_stream) {
   }
 }
 
+TARN_REPORTS_CUDA(mt2203_objects)
+
 }  // namespace

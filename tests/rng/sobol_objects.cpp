@@ -256,4 +256,6 @@ TEST_F(sobol_level, makes_engines_of_streams) {
   }
 }
 
+TARN_REPORTS_CUDA(sobol_objects)
+
 }  // namespace

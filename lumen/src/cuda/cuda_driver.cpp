@@ -26,8 +26,10 @@ class cuda_mark final : public stream_mark {
  public:
   // The first mark of a stream that keeps times has a time given, later ones have a reference; both
   // are missing elsewhere.
-  cuda_mark(cudaStream_t stream, bool timed, std::shared_ptr<cuda_mark> reference)
-      : reference_(std::move(reference)) {
+  cuda_mark(const device_record& device, cudaStream_t stream, bool timed,
+            std::shared_ptr<cuda_mark> reference)
+      : device_(device), reference_(std::move(reference)) {
+    use(device_);
     check_cuda(cudaEventCreateWithFlags(&event_, timed ? cudaEventDefault : cudaEventDisableTiming),
                "cudaEventCreateWithFlags");
     const cudaError_t recorded = cudaEventRecord(event_, stream);
@@ -36,12 +38,23 @@ class cuda_mark final : public stream_mark {
       check_cuda(recorded, "cudaEventRecord");
     }
   }
-  ~cuda_mark() override { static_cast<void>(cudaEventDestroy(event_)); }
+  // Marks are asked for from any thread, which has worked with another device or with none so far.
+  ~cuda_mark() override {
+    static_cast<void>(cudaSetDevice(device_.number));
+    static_cast<void>(cudaEventDestroy(event_));
+  }
 
   // A failure counts as the end: wait tells of it.
-  bool reached() noexcept override { return cudaEventQuery(event_) != cudaErrorNotReady; }
-  void wait() override { check_cuda(cudaEventSynchronize(event_), "cudaEventSynchronize"); }
+  bool reached() noexcept override {
+    return cudaSetDevice(device_.number) != cudaSuccess ||
+           cudaEventQuery(event_) != cudaErrorNotReady;
+  }
+  void wait() override {
+    use(device_);
+    check_cuda(cudaEventSynchronize(event_), "cudaEventSynchronize");
+  }
   std::uint64_t time() override {
+    use(device_);
     const std::lock_guard<std::mutex> lock(mutex_);
     if (reference_) {
       float milliseconds = 0;
@@ -57,6 +70,7 @@ class cuda_mark final : public stream_mark {
   cudaEvent_t event() const { return event_; }
 
  private:
+  const device_record& device_;
   cudaEvent_t event_{};
   std::mutex mutex_;
   std::shared_ptr<cuda_mark> reference_;  // until the time is known
@@ -71,7 +85,7 @@ class cuda_stream final : public command_stream {
                "cudaStreamCreateWithFlags");
     if (timed) {
       try {
-        reference_ = std::make_shared<cuda_mark>(stream_, true, nullptr);
+        reference_ = std::make_shared<cuda_mark>(device, stream_, true, nullptr);
         reference_->wait();
         reference_made_ = now_nanoseconds();
         reference_->set_time(reference_made_);
@@ -81,7 +95,10 @@ class cuda_stream final : public command_stream {
       }
     }
   }
-  ~cuda_stream() override { static_cast<void>(cudaStreamDestroy(stream_)); }
+  ~cuda_stream() override {
+    static_cast<void>(cudaSetDevice(device_.number));
+    static_cast<void>(cudaStreamDestroy(stream_));
+  }
 
   void launch(const launch_shape& shape, kernel_command& kernel) override {
     kernel.launch_native({shape, device_.number, stream_});
@@ -114,10 +131,10 @@ class cuda_stream final : public command_stream {
   }
   // Only managed memory moves by pages; elsewhere there is nothing to hint at.
   void prefetch(void* pointer, std::size_t bytes) override {
+    use(device_);
     cudaPointerAttributes where{};
     check_cuda(cudaPointerGetAttributes(&where, pointer), "cudaPointerGetAttributes");
     if (where.type == cudaMemoryTypeManaged && bytes != 0) {
-      use(device_);
       const cudaMemLocation here{cudaMemLocationTypeDevice, {device_.number}};
       check_cuda(cudaMemPrefetchAsync(pointer, bytes, here, 0, stream_), "cudaMemPrefetchAsync");
     }
@@ -131,9 +148,13 @@ class cuda_stream final : public command_stream {
     check_cuda(cudaStreamWaitEvent(stream_, static_cast<cuda_mark&>(mark).event(), 0),
                "cudaStreamWaitEvent");
   }
+  void drain() noexcept override {
+    static_cast<void>(cudaSetDevice(device_.number));
+    static_cast<void>(cudaStreamSynchronize(stream_));
+    static_cast<void>(cudaGetLastError());
+  }
   std::shared_ptr<stream_mark> mark() override {
-    use(device_);
-    auto made = std::make_shared<cuda_mark>(stream_, reference_ != nullptr, reference_);
+    auto made = std::make_shared<cuda_mark>(device_, stream_, reference_ != nullptr, reference_);
     if (reference_ && now_nanoseconds() - reference_made_ > renewal) {
       reference_ = made;
       reference_made_ = now_nanoseconds();

@@ -2,7 +2,6 @@
 // The backend of virtual devices that behave as a GPU of its own does: commands run behind the
 // caller's back, one stream a queue, and buffers have copies. The host's threads do the work.
 #include <condition_variable>
-#include <cstdlib>
 #include <deque>
 #include <exception>
 #include <functional>
@@ -60,7 +59,11 @@ class detached_stream final : public command_stream {
   explicit detached_stream(const device_record& device) : device_(device) {}
   ~detached_stream() override {
     if (thread_.joinable()) {
-      put([this] { over_ = true; });
+      {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        over_ = true;
+        come_.notify_one();
+      }
       thread_.join();
     }
   }
@@ -86,6 +89,11 @@ class detached_stream final : public command_stream {
       }
     });
   }
+  void drain() noexcept override {
+    std::unique_lock<std::mutex> lock(mutex_);
+    idle_.wait(lock, [this] { return waiting_.empty() && !working_; });
+    error_ = nullptr;
+  }
   std::shared_ptr<stream_mark> mark() override {
     auto made = std::make_shared<detached_mark>();
     put([this, made] { made->reach(std::exchange(error_, nullptr)); });
@@ -95,54 +103,50 @@ class detached_stream final : public command_stream {
  private:
   void put(std::function<void()> work) {
     const std::lock_guard<std::mutex> lock(mutex_);
-    waiting_.push_back(std::move(work));
     if (!thread_.joinable()) {
       thread_ = std::thread([this] { run(); });
     }
+    waiting_.push_back(std::move(work));
     come_.notify_one();
   }
   void run() {
-    while (!over_) {
-      std::function<void()> work;
-      {
-        std::unique_lock<std::mutex> lock(mutex_);
-        come_.wait(lock, [this] { return !waiting_.empty(); });
-        work = std::move(waiting_.front());
-        waiting_.pop_front();
+    std::unique_lock<std::mutex> lock(mutex_);
+    for (;;) {
+      come_.wait(lock, [this] { return !waiting_.empty() || over_; });
+      if (waiting_.empty()) {
+        return;
       }
+      const std::function<void()> work = std::move(waiting_.front());
+      waiting_.pop_front();
+      working_ = true;
+      lock.unlock();
       try {
         work();
       } catch (...) {
         error_ = error_ ? error_ : std::current_exception();
       }
+      lock.lock();
+      working_ = false;
+      idle_.notify_all();
     }
   }
 
   const device_record& device_;
   std::mutex mutex_;
   std::condition_variable come_;
+  std::condition_variable idle_;
   std::deque<std::function<void()>> waiting_;
   std::thread thread_;
-  // Touched by the thread alone.
-  std::exception_ptr error_;
+  bool working_ = false;
   bool over_ = false;
+  std::exception_ptr error_;  // touched by the thread alone while it works
 };
 
-class detached_driver final : public backend_driver {
+class detached_driver final : public host_memory_driver {
  public:
   std::vector<std::unique_ptr<device_record>> enumerate() override { return detached_devices(); }
-  void* allocate(const device_record&, usm::alloc, std::size_t alignment,
-                 std::size_t bytes) override {
-    return allocate_host(alignment, bytes);
-  }
-  void release(const device_record&, usm::alloc, void* pointer) noexcept override {
-    std::free(pointer);
-  }
   std::unique_ptr<command_stream> make_stream(const device_record& device, bool) override {
     return std::make_unique<detached_stream>(device);
-  }
-  void copy(const device_record&, void* to, const void* from, std::size_t bytes) override {
-    copy_bytes(to, from, bytes);
   }
 };
 

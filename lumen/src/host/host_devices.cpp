@@ -8,6 +8,7 @@
 #include <cstring>
 #include <unistd.h>
 
+#include "../common_properties.hpp"
 #include "../settings.hpp"
 
 LUMEN_NAMESPACE_BEGIN
@@ -43,19 +44,8 @@ std::uint64_t system_value(int name) {
   return value > 0 ? static_cast<std::uint64_t>(value) : 0;
 }
 
-// 128-bit vectors are what every x86-64 and AArch64 has.
-void set_vector_widths(device_properties& p) {
-  p.preferred_vector_width_char = p.native_vector_width_char = 16;
-  p.preferred_vector_width_short = p.native_vector_width_short = 8;
-  p.preferred_vector_width_int = p.native_vector_width_int = 4;
-  p.preferred_vector_width_long = p.native_vector_width_long = 2;
-  p.preferred_vector_width_float = p.native_vector_width_float = 4;
-  p.preferred_vector_width_double = p.native_vector_width_double = 2;
-  p.preferred_vector_width_half = p.native_vector_width_half = 0;
-}
-
 device_properties host_properties() {
-  device_properties p;
+  device_properties p = common_properties();
   p.device_type = info::device_type::cpu;
   p.name = cpuinfo("model name");
   if (p.name.empty()) {
@@ -69,30 +59,14 @@ device_properties host_properties() {
   p.driver_version = runtime_version;
   p.version = "1.0";
   p.backend_version = runtime_version;
-  p.profile = "FULL_PROFILE";
   p.max_compute_units = number_of_threads();
-  p.max_work_item_dimensions = 3;
   p.max_work_group_size = largest_group;
   p.max_num_sub_groups = static_cast<std::uint32_t>(largest_group);
-  p.sub_group_sizes = {1};
-  set_vector_widths(p);
   p.max_clock_frequency =
       static_cast<std::uint32_t>(std::strtod(cpuinfo("cpu MHz").c_str(), nullptr));
-  p.address_bits = 8 * sizeof(void*);
   p.global_mem_size = system_value(_SC_PHYS_PAGES) * system_value(_SC_PAGESIZE);
   p.max_mem_alloc_size = p.global_mem_size;
-  p.max_parameter_size = 4096;
   p.mem_base_addr_align = 1024;  // bits: the widest vector
-  const std::vector<info::fp_config> fp = {info::fp_config::denorm,
-                                           info::fp_config::inf_nan,
-                                           info::fp_config::round_to_nearest,
-                                           info::fp_config::round_to_zero,
-                                           info::fp_config::round_to_inf,
-                                           info::fp_config::fma,
-                                           info::fp_config::correctly_rounded_divide_sqrt};
-  p.single_fp_config = fp;
-  p.double_fp_config = fp;
-  p.global_mem_cache_type = info::global_mem_cache_type::read_write;
   p.global_mem_cache_line_size =
       static_cast<std::uint32_t>(system_value(_SC_LEVEL1_DCACHE_LINESIZE));
   p.global_mem_cache_size = system_value(_SC_LEVEL3_CACHE_SIZE);
@@ -102,27 +76,9 @@ device_properties host_properties() {
   p.local_mem_type = info::local_mem_type::global;
   p.local_mem_size = local_memory_bytes;
   p.host_unified_memory = true;
-  p.atomic_memory_order_capabilities = {memory_order::relaxed, memory_order::acquire,
-                                        memory_order::release, memory_order::acq_rel,
-                                        memory_order::seq_cst};
-  p.atomic_fence_order_capabilities = p.atomic_memory_order_capabilities;
-  p.atomic_memory_scope_capabilities = {memory_scope::work_item, memory_scope::sub_group,
-                                        memory_scope::work_group, memory_scope::device,
-                                        memory_scope::system};
-  p.atomic_fence_scope_capabilities = p.atomic_memory_scope_capabilities;
   p.profiling_timer_resolution = 1;
-  p.is_endian_little = __BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__;
-  p.is_available = true;
-  p.is_compiler_available = false;
-  p.is_linker_available = false;
   p.execution_capabilities = {info::execution_capability::exec_kernel,
                               info::execution_capability::exec_native_kernel};
-  p.queue_profiling = true;
-  p.preferred_interop_user_sync = true;
-  p.partition_properties = {};
-  p.partition_affinity_domains = {};
-  p.partition_type_property = info::partition_property::no_partition;
-  p.partition_type_affinity_domain = info::partition_affinity_domain::not_applicable;
   p.aspects = {aspect::cpu,
                aspect::host_debuggable,
                aspect::fp64,

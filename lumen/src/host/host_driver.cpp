@@ -68,35 +68,33 @@ class host_stream final : public command_stream {
   void prefetch(void*, std::size_t) override {}
   void advise(void*, std::size_t, int) override {}
   void wait_for(stream_mark&) override {}
+  void drain() noexcept override {}
   std::shared_ptr<stream_mark> mark() override { return nullptr; }
 
  private:
   const device_record& device_;
 };
 
-class host_driver final : public backend_driver {
+class host_driver final : public host_memory_driver {
  public:
   std::vector<std::unique_ptr<device_record>> enumerate() override { return host_devices(); }
-  void* allocate(const device_record&, usm::alloc, std::size_t alignment,
-                 std::size_t bytes) override {
-    return allocate_host(alignment, bytes);
-  }
-  void release(const device_record&, usm::alloc, void* pointer) noexcept override {
-    std::free(pointer);
-  }
   std::unique_ptr<command_stream> make_stream(const device_record& device, bool) override {
     return std::make_unique<host_stream>(device);
-  }
-  void copy(const device_record&, void* to, const void* from, std::size_t bytes) override {
-    copy_bytes(to, from, bytes);
   }
 };
 
 }  // namespace
 
-void* allocate_host(std::size_t alignment, std::size_t bytes) {
+void* host_memory_driver::allocate(const device_record&, usm::alloc, std::size_t alignment,
+                                   std::size_t bytes) {
   void* pointer = nullptr;
   return posix_memalign(&pointer, alignment, bytes) == 0 ? pointer : nullptr;
+}
+void host_memory_driver::release(const device_record&, usm::alloc, void* pointer) noexcept {
+  std::free(pointer);
+}
+void host_memory_driver::copy(const device_record&, void* to, const void* from, std::size_t bytes) {
+  copy_bytes(to, from, bytes);
 }
 
 void copy_bytes(void* to, const void* from, std::size_t bytes) {

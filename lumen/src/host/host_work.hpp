@@ -1,17 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
-// Commands done by the host's threads, on whatever device they are asked for.
+// Memory and commands of the host, on whatever device they are asked for.
 #pragma once
 
 #include <cstddef>
 
-#include "../device_record.hpp"
-#include "sycl/detail/command.hpp"
+#include "../backend.hpp"
 
 LUMEN_NAMESPACE_BEGIN
 namespace detail {
 
-// Null when there is not enough; given back by std::free.
-void* allocate_host(std::size_t alignment, std::size_t bytes);
+// Backends whose devices have their memory in the host's.
+class host_memory_driver : public backend_driver {
+ public:
+  void* allocate(const device_record& device, usm::alloc kind, std::size_t alignment,
+                 std::size_t bytes) override;
+  void release(const device_record& device, usm::alloc kind, void* pointer) noexcept override;
+  void copy(const device_record& device, void* to, const void* from, std::size_t bytes) override;
+};
+
 void copy_bytes(void* to, const void* from, std::size_t bytes);
 // `count` copies of the pattern.
 void fill_pattern(void* to, const void* pattern, std::size_t pattern_bytes, std::size_t count);

@@ -52,4 +52,6 @@ TYPED_TEST(beta_laws, hold_in_double) {
   this->template expect_all<double>();
 }
 
+TARN_REPORTS_CUDA(beta_laws)
+
 }  // namespace

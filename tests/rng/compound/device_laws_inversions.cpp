@@ -42,4 +42,6 @@ TYPED_TEST(inversion_laws, of_bernoulli_hold) {
   }
 }
 
+TARN_REPORTS_CUDA(inversion_laws)
+
 }  // namespace

@@ -123,4 +123,6 @@ TEST(negative_binomial_with_a_long_left_tail, ends_64_below_the_most_likely_valu
   EXPECT_FALSE(findings[1].failed()) << findings[1].statistic;
 }
 
+TARN_REPORTS_CUDA(trial_laws)
+
 }  // namespace

@@ -156,4 +156,6 @@ TYPED_TEST(vector_laws, of_poisson_v_hold) {
   }
 }
 
+TARN_REPORTS_CUDA(vector_laws)
+
 }  // namespace

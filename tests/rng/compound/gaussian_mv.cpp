@@ -319,4 +319,6 @@ TEST(gaussian_mv_on_a_gpu, vectors_have_the_mean_and_the_covariance_of_the_facto
   expect_law<matrix_layout::diagonal, method::icdf>();
 }
 
+TARN_REPORTS_CUDA(gaussian_mv)
+
 }  // namespace

@@ -7,6 +7,7 @@
 #include <atomic>
 #include <cstddef>
 #include <memory>
+#include <mutex>
 
 #include "config.hpp"
 #include "range.hpp"
@@ -43,7 +44,7 @@ class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core
   // The host's address for one in the copy on a device; others stay as they are.
   void* host_address(const device_record& device, void* address);
   // To be asked for only after address_on.
-  buffer_copies& copies() const { return *copies_.load(std::memory_order_acquire); }
+  buffer_copies& copies() const { return *made_copies(); }
   // There are contents: somebody has written them, or is about to.
   void define() noexcept { defined_.store(true, std::memory_order_relaxed); }
 
@@ -59,8 +60,13 @@ class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core
 
  private:
   std::size_t bytes_;
+  buffer_copies* made_copies() const;
+
+  // Whoever is about to write the host's memory says so before it looks for copies; whoever makes
+  // them finds it said, or is found by the other.
   std::atomic<bool> defined_{false};
-  std::atomic<buffer_copies*> copies_{nullptr};
+  mutable std::mutex copies_mutex_;
+  std::unique_ptr<buffer_copies> copies_;
   std::unique_ptr<access_record> record_;
 };
 

@@ -54,6 +54,8 @@ class LUMEN_EXPORT device_command : public command {
   virtual void enqueue(command_stream& stream, const launch_shape& shape) = 0;
   // Called once when the work is done, before its closure goes.
   virtual void finish();
+  // Whether finish does something that later commands may read.
+  virtual bool ends_on_host() const;
 };
 
 // Runs over items on a device; each kind of launch overrides its own function.

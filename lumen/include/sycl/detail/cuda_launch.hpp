@@ -13,10 +13,9 @@
 LUMEN_NAMESPACE_BEGIN
 namespace detail {
 
-constexpr unsigned cuda_block = 256;          // threads of a block of a range
-constexpr unsigned cuda_largest = 1024;       // items of a group, the most that a block may have
-constexpr std::size_t cuda_plain = 48 << 10;  // bytes of local memory that need no asking
-constexpr int cuda_devices_known = 16;        // whose answers are kept
+constexpr unsigned cuda_block = 256;     // threads of a block of a range
+constexpr unsigned cuda_largest = 1024;  // items of a group, the most that a block may have
+constexpr int cuda_devices_known = 16;   // whose answers are kept
 
 template <typename Function>
 __global__ void cuda_single(const __grid_constant__ Function function) {
@@ -54,16 +53,19 @@ __global__ void __launch_bounds__(cuda_largest)
   function(nd_item_maker::make<Dimensions>(frame, threadIdx.x));
 }
 
-// More local memory than is plain has to be asked for: all that the device has for this kernel, so
-// that launches with different needs do not take it from one another.
+// More local memory than a kernel has by default has to be asked for: all that the device has for
+// it, so that launches with different needs do not take it from one another.
 inline void allow_local_memory(const void* entry, const native_launch& launch) {
-  if (launch.shape.local_bytes > cuda_plain) {
+  if (launch.shape.local_bytes == 0) {
+    return;
+  }
+  cudaFuncAttributes own{};
+  check_cuda(cudaFuncGetAttributes(&own, entry), "cudaFuncGetAttributes");
+  if (launch.shape.local_bytes > static_cast<std::size_t>(own.maxDynamicSharedSizeBytes)) {
     int most = 0;
     check_cuda(
         cudaDeviceGetAttribute(&most, cudaDevAttrMaxSharedMemoryPerBlockOptin, launch.device),
         "cudaDeviceGetAttribute");
-    cudaFuncAttributes own{};
-    check_cuda(cudaFuncGetAttributes(&own, entry), "cudaFuncGetAttributes");
     check_cuda(cudaFuncSetAttribute(entry, cudaFuncAttributeMaxDynamicSharedMemorySize,
                                     most - static_cast<int>(own.sharedSizeBytes)),
                "cudaFuncSetAttribute");

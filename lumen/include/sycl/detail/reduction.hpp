@@ -150,6 +150,7 @@ class range_reduction final : public kernel_command {
     runs_.keep(begin, reducers);
   }
   void finish() override { runs_.finish(); }
+  bool ends_on_host() const override { return true; }
 
  private:
   range<Dimensions> sizes_;
@@ -183,6 +184,7 @@ class nd_range_reduction final : public kernel_command {
     runs_.keep(number, reducers);
   }
   void finish() override { runs_.finish(); }
+  bool ends_on_host() const override { return true; }
 
  private:
   Function function_;
