@@ -33,10 +33,10 @@ if(TARN_SANITIZE)
   add_link_options(-fsanitize=${TARN_SANITIZE})
 endif()
 
-# What every test finds in its environment.
-set(TARN_TEST_ENV "")
+# What every test finds in its environment. Native devices are for the tests that are about them.
+set(TARN_TEST_ENV "LUMEN_BACKENDS=virtual\\;cuda")
 if(TARN_SANITIZE MATCHES "thread")
-  set(TARN_TEST_ENV "TSAN_OPTIONS=suppressions=${CMAKE_CURRENT_LIST_DIR}/thread_sanitizer.supp")
+  list(APPEND TARN_TEST_ENV "TSAN_OPTIONS=suppressions=${CMAKE_CURRENT_LIST_DIR}/thread_sanitizer.supp")
 endif()
 
 # Warnings for our own targets only, never for those who link us.

@@ -2,9 +2,10 @@
 # Proves that no #include goes against the arrows between the subsystems:
 #   cmake -DROOT=<tree> -P cmake/check_includes.cmake
 # The two tables below are the rule. A folder may always open its own files, tests/<folder> and
-# bench/<folder> may open what they test and measure, tools and their tests may open the sources of
-# the statistics library, whose tables they make, kernels in rng may open the tables of the inverse
-# error function, which are data made by a tool, and lists (.def) are data that everyone may read.
+# bench/<folder> may open what they test and measure, every test may open the doubles of drivers,
+# tools and their tests may open the sources of the statistics library, whose tables they make,
+# kernels in rng may open the tables of the inverse error function, which are data made by a tool, and
+# lists (.def) are data that everyone may read.
 # Includes are resolved by name over the whole tree, without the compiler's search paths; when a name
 # could mean several files of other folders, each of them has to be allowed.
 cmake_minimum_required(VERSION 3.25)
@@ -38,6 +39,9 @@ function(may_open out from spelled to)
   string(REGEX REPLACE "/.*" "" to_folder "${to}")
   set(${out} TRUE PARENT_SCOPE)
   if(from_folder STREQUAL to_folder OR to MATCHES "\\.def$" OR from MATCHES "^(tests|bench)/${to_folder}/")
+    return()
+  endif()
+  if(from MATCHES "^(lumen/)?tests/" AND to MATCHES "^tests/doubles/[^/]*\\.hpp$")
     return()
   endif()
   if(from MATCHES "^(tests/)?tools/" AND to MATCHES "^statistics/(src|common)/")

@@ -89,19 +89,19 @@ void buffer_core::to_host(access_kind use) {
   }
 }
 
-void* buffer_core::address_on(const device_record& device) {
+void* buffer_core::address_on(const memory_place& place) {
   {
     const std::lock_guard<std::mutex> lock(copies_mutex_);
     if (!copies_) {
       copies_ = std::make_unique<buffer_copies>(data_, bytes_, defined_.load());
     }
   }
-  return copies_->address_on(device);
+  return copies_->address_on(place);
 }
 
-void* buffer_core::host_address(const device_record& device, void* address) {
+void* buffer_core::host_address(const memory_place& place, void* address) {
   buffer_copies* const made = made_copies();
-  return made == nullptr ? address : made->host_address(device, address);
+  return made == nullptr ? address : made->host_address(place, address);
 }
 
 bool buffer_core::come_home() noexcept {
@@ -129,12 +129,23 @@ void wait_for_others(const std::vector<task_ref>& tasks) {
   }
 }
 
+// A place for the contents may be an iterator that throws: destructors tell of it.
+void write_back_now(buffer_core& core) noexcept {
+  try {
+    core.write_back();
+  } catch (const std::exception& error) {
+    std::fprintf(stderr, "exception in ~buffer: %s\n", error.what());
+  } catch (...) {
+    std::fputs("exception in ~buffer\n", stderr);
+  }
+}
+
 // The buffer dies with the closure of a task: its other users may have to wait for that task, so
 // nobody waits for them here.
 class late_write_back final : public host_command {
  public:
   explicit late_write_back(std::shared_ptr<buffer_core> core) : core_(std::move(core)) {}
-  void run(const interop_handle&) override { core_->write_back(); }
+  void run(const interop_handle&) override { write_back_now(*core_); }
 
  private:
   std::shared_ptr<buffer_core> core_;
@@ -219,13 +230,13 @@ buffer_handle::~buffer_handle() {
   while (const task_ref user = unfinished()) {
     user->wait();
   }
-  core->write_back();
+  write_back_now(*core);
 }
 
 namespace {
 // Several accessors of a group to one buffer are one access: what one of them gives up another may
 // read.
-void note_access(handler& group, buffer_core& core, access_kind use, const device_record* place) {
+void note_access(handler& group, buffer_core& core, access_kind use, const memory_place* place) {
   if (place == nullptr && use.writes) {
     core.define();
   }
@@ -246,13 +257,13 @@ void require_on_host(handler& group, buffer_core& core, access_kind use) {
 }
 
 void* require_on_device(handler& group, buffer_core& core, void* host, access_kind use) {
-  const device_record& device = handler_access::group(group).queue->record;
-  if (!device.detached) {
+  const memory_place& place = *handler_access::group(group).queue->place;
+  if (!place.device.detached) {
     require_on_host(group, core, use);
     return host;
   }
-  char* const there = static_cast<char*>(core.address_on(device));
-  note_access(group, core, use, &device);
+  char* const there = static_cast<char*>(core.address_on(place));
+  note_access(group, core, use, &place);
   return there + (static_cast<char*>(host) - static_cast<char*>(core.data()));
 }
 
@@ -265,7 +276,7 @@ void* back_on_host(handler& group, buffer_core& core, void* address) {
       }
     }
   }
-  return core.host_address(handler_access::group(group).queue->record, address);
+  return core.host_address(*handler_access::group(group).queue->place, address);
 }
 
 std::shared_ptr<void> hold_for_host(const std::shared_ptr<buffer_core>& core, access_kind use) {

@@ -11,39 +11,40 @@ namespace detail {
 
 buffer_copies::~buffer_copies() {
   for (const copy& each : copies_) {
-    each.device->driver->release(*each.device, usm::alloc::device, each.memory);
+    each.place->device.driver->release(*each.place, usm::alloc::device, each.memory);
   }
 }
 
-buffer_copies::copy& buffer_copies::copy_on(const device_record& device) {
-  const auto found = std::find_if(copies_.begin(), copies_.end(),
-                                  [&device](const copy& each) { return each.device == &device; });
+buffer_copies::copy& buffer_copies::copy_in(const memory_place& place) {
+  const auto found = std::find_if(copies_.begin(), copies_.end(), [&place](const copy& each) {
+    return each.place.get() == &place;
+  });
   if (found != copies_.end()) {
     return *found;
   }
   constexpr std::size_t alignment = 256;  // of every device's own allocations
   copies_.reserve(copies_.size() + 1);
-  void* memory = device.driver->allocate(device, usm::alloc::device, alignment,
-                                         std::max(bytes_, std::size_t{1}));
+  void* memory = place.device.driver->allocate(place, usm::alloc::device, alignment,
+                                               std::max(bytes_, std::size_t{1}));
   if (memory == nullptr) {
     throw exception(make_error_code(errc::memory_allocation),
                     "a buffer does not fit in the memory of the device");
   }
-  copies_.push_back({&device, memory, false, nullptr});
+  copies_.push_back({place.shared_from_this(), memory, false, nullptr});
   return copies_.back();
 }
 
-void* buffer_copies::address_on(const device_record& device) {
+void* buffer_copies::address_on(const memory_place& place) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  return copy_on(device).memory;
+  return copy_in(place).memory;
 }
 
-void* buffer_copies::host_address(const device_record& device, void* address) {
+void* buffer_copies::host_address(const memory_place& place, void* address) {
   const std::lock_guard<std::mutex> lock(mutex_);
   const auto number = [](const void* pointer) { return reinterpret_cast<std::uintptr_t>(pointer); };
   for (const copy& each : copies_) {
     // One past the end is an address of the copy as well: that of an empty window.
-    if (each.device == &device && number(address) >= number(each.memory) &&
+    if (each.place.get() == &place && number(address) >= number(each.memory) &&
         number(address) - number(each.memory) <= bytes_) {
       return host_ + (number(address) - number(each.memory));
     }
@@ -67,17 +68,16 @@ void buffer_copies::bring_home() {
   if (source->arrival) {
     source->arrival->wait();
   }
-  source->device->driver->copy(*source->device, host_, source->memory, bytes_);
+  source->place->device.driver->copy(*source->place, host_, source->memory, bytes_);
   host_current_ = true;
 }
 
-void buffer_copies::to_device(const device_record& device, command_stream& stream,
-                              access_kind use) {
+void buffer_copies::to_device(const memory_place& place, command_stream& stream, access_kind use) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  copy& mine = copy_on(device);
+  copy& mine = copy_in(place);
   if (!mine.current && use.keeps) {
     copy* const other = host_current_ ? nullptr : current_copy();
-    if (other != nullptr && other->device->driver == device.driver) {
+    if (other != nullptr && copies_directly(*other->place, place)) {
       if (other->arrival) {
         stream.wait_for(*other->arrival);
       }

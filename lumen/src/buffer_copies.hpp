@@ -25,21 +25,21 @@ class buffer_copies {
   ~buffer_copies();
 
   // The place of the copy, made at first use; throws errc::memory_allocation.
-  void* address_on(const device_record& device);
-  void* host_address(const device_record& device, void* address);
-  // Sees to it that commands which go into the stream from now on find the contents on the device.
-  void to_device(const device_record& device, command_stream& stream, access_kind use);
+  void* address_on(const memory_place& place);
+  void* host_address(const memory_place& place, void* address);
+  // Sees to it that commands which go into the stream from now on find the contents in the place.
+  void to_device(const memory_place& place, command_stream& stream, access_kind use);
   // Makes the host's memory current, on return.
   void to_host(access_kind use);
 
  private:
   struct copy {
-    const device_record* device;
+    std::shared_ptr<const memory_place> place;
     void* memory;
     bool current;
     std::shared_ptr<stream_mark> arrival;  // of contents that may still be on their way, or null
   };
-  copy& copy_on(const device_record& device);
+  copy& copy_in(const memory_place& place);
   copy* current_copy();
   void bring_home();
 

@@ -35,6 +35,12 @@ void kernel_command::launch_native(const native_launch&) const {
                   "the program holds no code of this kernel for the device");
 }
 
+void command_stream::launch(const native_shape&, native_kernel&,
+                            const std::vector<kernel_argument>&) {
+  throw exception(make_error_code(errc::kernel_not_supported),
+                  "the device does not run native kernels");
+}
+
 void throw_native(const char* tried, const char* said, bool memory) {
   throw exception(make_error_code(memory ? errc::memory_allocation : errc::runtime),
                   std::string(tried) + ": " + said);

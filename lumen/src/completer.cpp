@@ -48,6 +48,10 @@ void completer::add(task& issued) {
     const std::lock_guard<std::mutex> lock(mutex_);
     try {
       if (process_ != getpid()) {
+        // What a parent's thread had is nobody's here.
+        first_ = last_ = held_ = nullptr;
+        giving_back_ = nullptr;
+        count_ = 0;
         std::thread worker([this] { work(); });
         process_ = getpid();
         thread_ = worker.get_id();
@@ -55,6 +59,9 @@ void completer::add(task& issued) {
       }
     } catch (const std::bad_alloc&) {
     } catch (const std::system_error&) {
+    }
+    if (issued.done()) {
+      return;
     }
     if (process_ == getpid()) {
       issued.retain();
@@ -66,25 +73,68 @@ void completer::add(task& issued) {
   issued.wait();
 }
 
+void completer::remove(task& done) {
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    if (!done.watched) {
+      return;
+    }
+    unlink(done);
+  }
+  done.release();
+}
+
+void completer::settle(const queue_core& queue) {
+  std::unique_lock<std::mutex> lock(mutex_);
+  if (process_ != getpid() || std::this_thread::get_id() == thread_) {
+    return;
+  }
+  put_down_.wait(lock, [this, &queue] {
+    return giving_back_ != &queue &&
+           (held_ == nullptr || held_->queue().get() != &queue || !held_->done());
+  });
+}
+
 void completer::put_back(task& open) {
+  open.watched = true;
   open.ready_next = nullptr;
+  open.ready_previous = last_;
   (first_ != nullptr ? last_->ready_next : first_) = &open;
   last_ = &open;
   ++count_;
+}
+
+void completer::unlink(task& watched) {
+  (watched.ready_previous != nullptr ? watched.ready_previous->ready_next : first_) =
+      watched.ready_next;
+  (watched.ready_next != nullptr ? watched.ready_next->ready_previous : last_) =
+      watched.ready_previous;
+  watched.watched = false;
+  --count_;
 }
 
 // The first of the list, or null.
 task* completer::take() {
   task* const taken = first_;
   if (taken != nullptr) {
-    first_ = taken->ready_next;
-    --count_;
+    unlink(*taken);
   }
   return taken;
 }
 
-void completer::put_down() {
-  holds_ = false;
+// What the thread held is done or goes back to the list.
+void completer::let_go(std::unique_lock<std::mutex>& lock) {
+  task& each = *held_;
+  held_ = nullptr;
+  if (each.done()) {
+    giving_back_ = each.queue().get();
+    lock.unlock();
+    each.release();
+    lock.lock();
+    giving_back_ = nullptr;
+  } else {
+    put_back(each);
+  }
   put_down_.notify_all();
 }
 
@@ -99,7 +149,7 @@ bool completer::sweep() {
     if (each == nullptr) {
       break;
     }
-    holds_ = true;
+    held_ = each;
     lock.unlock();
     const queue_core* const owner = each->queue().get();
     const bool open = !each->done() && (busy.has(owner) || !each->reached());
@@ -107,14 +157,10 @@ bool completer::sweep() {
       busy.add(owner);
     } else {
       each->wait();
-      each->release();
-      any = true;
     }
+    any = any || !open;
     lock.lock();
-    if (open) {
-      put_back(*each);
-    }
-    put_down();
+    let_go(lock);
   }
   return any;
 }
@@ -140,7 +186,7 @@ void completer::end_all() {
       each->wait();
       each->release();
       lock.lock();
-    } else if (holds_ && !self) {
+    } else if ((held_ != nullptr || giving_back_ != nullptr) && !self) {
       put_down_.wait(lock);
     } else {
       return;

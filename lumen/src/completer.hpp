@@ -22,6 +22,12 @@ class completer {
   static completer& instance();
   // Needs no memory. Where there is no thread to be had, the task is waited for at once.
   void add(task& issued);
+  // Lets go of a task that another thread has ended. Those that the thread has in its hands it lets
+  // go soon.
+  void remove(task& done);
+  // Returns when the thread holds none of the queue's tasks that are done. It runs the user's code
+  // before that, and nobody waits for it here.
+  void settle(const queue_core& queue);
   // For the end of the process: ends all tasks on the calling thread. On return no other thread
   // touches one.
   void end_all();
@@ -31,17 +37,19 @@ class completer {
   bool sweep();
   task* take();
   void put_back(task& open);
-  void put_down();
+  void unlink(task& watched);
+  void let_go(std::unique_lock<std::mutex>& lock);
 
   std::mutex mutex_;
   std::condition_variable come_;
   std::condition_variable put_down_;
-  // Linked by ready_next; each is retained.
+  // Linked by ready_next and ready_previous; each is retained and marked as watched.
   task* first_ = nullptr;
   task* last_ = nullptr;
   std::size_t count_ = 0;
-  bool holds_ = false;  // the thread has one of them in its hands
-  pid_t process_ = 0;   // where the thread is: a child made by fork has none of its own yet
+  task* held_ = nullptr;                     // the one that the thread looks after, or null
+  const queue_core* giving_back_ = nullptr;  // the queue of one that it lets go, or null
+  pid_t process_ = 0;  // where the thread is: a child made by fork has none of its own yet
   std::thread::id thread_;
 };
 

@@ -2,9 +2,11 @@
 // Contexts.
 #include "sycl/detail/context.hpp"
 
+#include <algorithm>
 #include <mutex>
 #include <utility>
 
+#include "backend.hpp"
 #include "context_state.hpp"
 #include "sycl/detail/buffer_core.hpp"
 #include "sycl/detail/usm.hpp"
@@ -34,6 +36,14 @@ context::context(const std::vector<device>& devices, async_handler handler, cons
   }
   state_->devices = devices;
   state_->handler = std::move(handler);
+  std::vector<const detail::device_record*> records;
+  for (const device& dev : devices) {
+    records.push_back(&detail::device_record::of(dev));
+  }
+  if (detail::native_platform* const platform = records.front()->driver->native()) {
+    state_->native = platform->make_context(records);
+  }
+  state_->make_places();
 }
 
 backend context::get_backend() const noexcept {
@@ -68,20 +78,38 @@ LUMEN_CONTEXT_INFO(atomic_fence_scope_capabilities, memory_scope)
 
 namespace detail {
 
+void context_state::make_places() {
+  for (const device& dev : devices) {
+    const device_record& record = device_record::of(dev);
+    places.push_back(record.place ? record.place : std::make_shared<memory_place>(record, native));
+  }
+}
+
+const std::shared_ptr<memory_place>& context_state::place_of(const device& dev) const {
+  const auto found = std::find(devices.begin(), devices.end(), dev);
+  if (found == devices.end()) {
+    throw_invalid("the device is not of the context");
+  }
+  return places[static_cast<std::size_t>(found - devices.begin())];
+}
+
 // Queues made from a device alone share one context a platform, which holds all its devices:
-// memory allocated through one such queue is known to the others.
+// memory allocated through one such queue is known to the others. A sub-device has a context of its
+// own.
 context default_context(const device& dev) {
   static std::mutex mutex;
-  static auto& made = *new std::vector<std::pair<platform, context>>;
+  static auto& made = *new std::vector<context>;
   const platform owner = dev.get_platform();
+  const std::vector<device> wanted =
+      device_record::of(dev).parent == nullptr ? owner.get_devices() : std::vector<device>{dev};
   const std::lock_guard<std::mutex> lock(mutex);
-  for (const auto& entry : made) {
-    if (entry.first == owner) {
-      return entry.second;
+  for (const context& each : made) {
+    if (context_state::of(each).devices == wanted) {
+      return each;
     }
   }
-  made.emplace_back(owner, context(owner.get_devices()));
-  return made.back().second;
+  made.emplace_back(wanted);
+  return made.back();
 }
 
 device first_device(const context& ctx) {

@@ -5,38 +5,124 @@
 #include <algorithm>
 
 #include "backend.hpp"
-#include "device_record.hpp"
+#include "executor.hpp"
+#include "memory_place.hpp"
+#include "settings.hpp"
 #include "sycl/detail/context.hpp"
 
 LUMEN_NAMESPACE_BEGIN
 
 namespace detail {
 
-const std::vector<const device_record*>& all_devices() {
-  // The records and drivers are never released: handles and threads may outlive main.
+namespace {
+
+// Takes the devices of a backend into a list, each with its place where contexts have no say.
+// Returns whether there are any. The records are never released, nor are their drivers: handles and
+// threads may outlive main.
+bool add_devices(backend_driver& driver, std::vector<const device_record*>& list) {
+  const std::size_t before = list.size();
+  for (std::unique_ptr<device_record>& record : driver.enumerate()) {
+    record->driver = &driver;
+    if (driver.native() == nullptr) {
+      record->place = std::make_shared<memory_place>(*record, nullptr);
+    }
+    list.push_back(record.release());
+  }
+  return list.size() != before;
+}
+
+// The platforms whose kernels are their own, with their devices.
+struct native_backends {
+  native_platform* opencl = nullptr;
+  native_platform* level_zero = nullptr;
+  std::vector<const device_record*> devices;
+
+  native_backends() {
+    const backend_choice wanted = backends_from_environment();
+    if (wanted.opencl) {
+      add(make_opencl_driver(), opencl);
+    }
+    if (wanted.level_zero) {
+      add(make_level_zero_driver(), level_zero);
+    }
+    if (!devices.empty()) {
+      executor::stop_before_others();
+    }
+  }
+  static const native_backends& instance() {
+    static const auto& only = *new native_backends;
+    return only;
+  }
+
+ private:
+  void add(std::unique_ptr<backend_driver> made, native_platform*& platform) {
+    platform = made->native();
+    if (platform != nullptr) {
+      add_devices(*made.release(), devices);
+    }
+  }
+};
+
+bool is_native(backend kind) {
+  return kind == backend::opencl || kind == backend::ext_kestrel_level_zero;
+}
+
+std::vector<const device_record*> all_devices() {
+  std::vector<const device_record*> all = own_devices();
+  all.insert(all.end(), native_devices().begin(), native_devices().end());
+  return all;
+}
+
+// These rate the host above every native device, so that no driver is loaded to find the best.
+bool prefers_own_devices(const selector_view& selector) {
+  return selector.object == reinterpret_cast<const void*>(&default_selector_v) ||
+         selector.object == reinterpret_cast<const void*>(&cpu_selector_v);
+}
+
+}  // namespace
+
+const std::vector<const device_record*>& own_devices() {
   static const auto& devices = *[] {
     auto* found = new std::vector<const device_record*>;
-    for (const auto& make : {
-           make_host_driver, make_detached_driver,
-#if defined(LUMEN_CUDA)
-               make_cuda_driver,
-#endif
-         }) {
-      backend_driver* driver = make().release();
-      for (std::unique_ptr<device_record>& record : driver->enumerate()) {
-        record->driver = driver;
-        found->push_back(record.release());
+    const backend_choice wanted = backends_from_environment();
+    const auto add = [found](std::unique_ptr<backend_driver> made) {
+      if (add_devices(*made, *found)) {
+        static_cast<void>(made.release());
       }
+    };
+    add(make_host_driver());
+    add(make_detached_driver());
+#if defined(LUMEN_CUDA)
+    if (wanted.cuda) {
+      add(make_cuda_driver());
     }
+#endif
+    static_cast<void>(wanted);
     return found;
   }();
   return devices;
 }
 
+const std::vector<const device_record*>& native_devices() {
+  return native_backends::instance().devices;
+}
+
+native_platform& native_platform_of(backend kind) {
+  const native_backends& found = native_backends::instance();
+  native_platform* const platform = kind == backend::opencl ? found.opencl : found.level_zero;
+  if (!is_native(kind) || platform == nullptr) {
+    throw exception(make_error_code(errc::platform),
+                    "the backend of the native handle is not there: its loader is missing, or "
+                    "LUMEN_BACKENDS leaves it out");
+  }
+  return *platform;
+}
+
 device select_device(const selector_view& selector) {
   const device_record* best = nullptr;
   int best_rating = -1;
-  for (const device_record* record : all_devices()) {
+  for (const device_record* record :
+       prefers_own_devices(selector) ? own_devices() : all_devices()) {
     const device candidate = device_record::handle(*record);
     const int rating = selector.rate(selector.object, candidate);
     if (rating > best_rating) {
@@ -133,6 +219,9 @@ LUMEN_EXPORT platform device::get_info<info::device::platform>() const {
 }
 template <>
 LUMEN_EXPORT device device::get_info<info::device::parent_device>() const {
+  if (record_->parent != nullptr) {
+    return device(record_->parent);
+  }
   throw exception(make_error_code(errc::invalid), "the device is not a sub-device");
 }
 template <>
@@ -154,7 +243,7 @@ platform::platform() : platform(default_selector_v) {}
 
 std::vector<platform> platform::get_platforms() {
   std::vector<platform> result;
-  for (const device_record* record : detail::all_devices()) {
+  for (const detail::device_record* record : detail::all_devices()) {
     const platform candidate(record->platform);
     if (std::find(result.begin(), result.end(), candidate) == result.end()) {
       result.push_back(candidate);
@@ -164,9 +253,12 @@ std::vector<platform> platform::get_platforms() {
 }
 std::vector<device> platform::get_devices(info::device_type type) const {
   std::vector<device> result;
-  for (const device& candidate : device::get_devices(type)) {
-    if (candidate.get_platform() == *this) {
-      result.push_back(candidate);
+  const auto& candidates =
+      detail::is_native(record_->kind) ? detail::native_devices() : detail::own_devices();
+  for (const device_record* candidate : candidates) {
+    if (candidate->platform == record_ &&
+        (type == info::device_type::all || type == candidate->properties.device_type)) {
+      result.push_back(device_record::handle(*candidate));
     }
   }
   return result;

@@ -3,6 +3,7 @@
 // live as long as the process, so handles to them are plain pointers.
 #pragma once
 
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -12,6 +13,7 @@ LUMEN_NAMESPACE_BEGIN
 namespace detail {
 
 class backend_driver;
+struct memory_place;
 
 // One answer for each row of the list of device queries.
 struct device_properties {
@@ -27,6 +29,7 @@ struct platform_record {
   std::string version;
   std::string profile;
   std::vector<std::string> extensions;
+  void* native = nullptr;  // the platform's own handle; null where there is none
 };
 
 struct device_record {
@@ -40,13 +43,21 @@ struct device_record {
   // Whether its commands go through a stream while the host goes on, and buffers have a copy in
   // its memory.
   bool detached = false;
+  // The platform's own handle; null where there is none.
+  void* native = nullptr;
+  // Of a sub-device.
+  const device_record* parent = nullptr;
+  // Null where the memory belongs to contexts.
+  std::shared_ptr<memory_place> place;
 
   static const device_record& of(const device& dev) { return *dev.record_; }
   static device handle(const device_record& record) { return device(&record); }
 };
 
-// All devices of all backends, in the order of their enumeration.
-const std::vector<const device_record*>& all_devices();
+// Devices of the backends that run kernels of this program, in the order of their enumeration.
+const std::vector<const device_record*>& own_devices();
+// Devices that run native kernels only. Asking for them loads their drivers, which takes a while.
+const std::vector<const device_record*>& native_devices();
 
 }  // namespace detail
 LUMEN_NAMESPACE_END

@@ -44,6 +44,10 @@ executor& executor::instance() {
 
 // The process may do all its work in streams and never start a worker.
 executor::executor() : thread_count_(number_of_threads()), process_(getpid()) {
+  stop_before_others();
+}
+
+void executor::stop_before_others() {
   std::atexit([] { instance().stop(); });
 }
 
@@ -275,6 +279,7 @@ void executor::stop() {
       thread.join();
     }
   }
+  threads_.clear();  // the next call finds none
 }
 
 }  // namespace detail

@@ -47,6 +47,9 @@ class executor {
  public:
   // Lives until the process ends; its threads are joined at exit.
   static executor& instance();
+  // Ends the work of the process at its end before those that have registered themselves so far do
+  // anything: drivers that were loaded late end their own.
+  static void stop_before_others();
 
   unsigned thread_count() const noexcept { return thread_count_; }
 

@@ -11,6 +11,7 @@
 #include "backend.hpp"
 #include "event_access.hpp"
 #include "handler_access.hpp"
+#include "native_access.hpp"
 #include "queue_core.hpp"
 #include "sycl/detail/reduction.hpp"
 #include "task.hpp"
@@ -82,14 +83,19 @@ std::unique_ptr<detail::device_command> memory_work(Function function) {
   return std::make_unique<memory_command<Function>>(std::move(function));
 }
 
-void check_code(const detail::kernel_command& kernel, const detail::command_group& group) {
+// What would serve a device that the program has no code for.
+std::string way_out(backend kind) {
+  return kind == backend::cuda
+             ? "compile the unit that launches it with nvcc (Tarn's own kernels: the CMake preset "
+               "cuda), or choose another device"
+             : "lumen compiles kernels for the host and for CUDA devices only. Build Tarn with "
+               "another SYCL (-DTARN_SYCL=AdaptiveCpp), or, for an NVIDIA GPU, with the CMake "
+               "preset "
+               "cuda, and take the device of its CUDA backend; or choose another device";
+}
+
+void check_placeholders(const detail::command_group& group) {
   const detail::device_record& device = group.queue->record;
-  if (!kernel.serves(device.platform->kind)) {
-    throw exception(make_error_code(errc::kernel_not_supported),
-                    "the program holds no code of this kernel for " + device.properties.name +
-                        ": compile the unit that launches it with nvcc (Tarn's own kernels: the "
-                        "CMake preset cuda), or choose another device");
-  }
   const auto on_host = [](const detail::access_request& access) { return access.place == nullptr; };
   if (device.detached && std::any_of(group.accesses.begin(), group.accesses.end(), on_host)) {
     throw exception(make_error_code(errc::feature_not_supported),
@@ -97,6 +103,31 @@ void check_code(const detail::kernel_command& kernel, const detail::command_grou
                     "is too late for a device with memory of its own: make it from the handler");
   }
 }
+
+void check_code(const detail::kernel_command& kernel, const detail::command_group& group) {
+  const detail::device_record& device = group.queue->record;
+  if (!kernel.serves(device.platform->kind)) {
+    throw exception(make_error_code(errc::kernel_not_supported),
+                    "the program holds no code of this kernel for " + device.properties.name +
+                        ": " + way_out(device.platform->kind));
+  }
+  check_placeholders(group);
+}
+
+class native_launch_command final : public detail::device_command {
+ public:
+  native_launch_command(std::shared_ptr<detail::native_kernel> kernel, bool grouped,
+                        std::vector<detail::kernel_argument> arguments)
+      : kernel_(std::move(kernel)), grouped_(grouped), arguments_(std::move(arguments)) {}
+  void enqueue(detail::command_stream& stream, const detail::launch_shape& shape) override {
+    stream.launch({shape, grouped_}, *kernel_, arguments_);
+  }
+
+ private:
+  std::shared_ptr<detail::native_kernel> kernel_;
+  bool grouped_;
+  std::vector<detail::kernel_argument> arguments_;
+};
 
 void check_pointer(const void* pointer, std::size_t bytes, const char* text) {
   if (pointer == nullptr && bytes != 0) {
@@ -142,6 +173,60 @@ void handler::launch(const detail::launch_shape& shape,
   group_.shape = shape;
   group_.shape.local_bytes = group_.local_bytes;
   run_on_device(std::move(work));
+}
+
+void handler::launch_native(const detail::launch_shape& shape, bool grouped, const kernel& native) {
+  const auto& made = detail::native_access::kernel_of(native);
+  const detail::queue_core& core = *group_.queue;
+  if (core.place->context == nullptr || core.place->context->handle() != made->context().handle()) {
+    detail::throw_invalid("the kernel is not of the queue's context");
+  }
+  if (grouped) {
+    check_groups(shape, core.record.properties.max_work_group_size);
+  }
+  check_placeholders(group_);
+  group_.shape = shape;
+  run_on_device(
+      std::make_unique<native_launch_command>(made, grouped, std::move(group_.arguments)));
+}
+
+namespace {
+void set_argument(std::vector<detail::kernel_argument>& arguments, detail::kernel_argument set) {
+  if (set.index < 0) {
+    throw exception(make_error_code(errc::kernel_argument),
+                    "the position of a kernel's argument is negative");
+  }
+  const auto before = std::find_if(arguments.begin(), arguments.end(),
+                                   [&set](const auto& each) { return each.index == set.index; });
+  if (before == arguments.end()) {
+    arguments.push_back(std::move(set));
+  } else {
+    *before = std::move(set);
+  }
+}
+}  // namespace
+
+void handler::set_value(int index, const void* value, std::size_t bytes) {
+  const auto* const first = static_cast<const unsigned char*>(value);
+  set_argument(group_.arguments,
+               {index, detail::argument_kind::value, {first, first + bytes}, nullptr, 0});
+}
+void handler::set_pointer(int index, const void* pointer) {
+  set_argument(group_.arguments,
+               {index, detail::argument_kind::pointer, {}, const_cast<void*>(pointer), 0});
+}
+void handler::set_local(int index, std::size_t bytes) {
+  set_argument(group_.arguments, {index, detail::argument_kind::local_memory, {}, nullptr, bytes});
+}
+
+void handler::ext_kestrel_barrier() {
+  group_.fence = detail::fence_kind::after_all;
+  run_on_device(nullptr);
+}
+void handler::ext_kestrel_barrier(const std::vector<event>& events) {
+  depends_on(events);
+  group_.fence = detail::fence_kind::after_dependencies;
+  run_on_device(nullptr);
 }
 
 void handler::run_on_device(std::unique_ptr<detail::device_command> work) {
@@ -193,18 +278,25 @@ void handler::mem_advise(void* pointer, std::size_t bytes, int advice) {
 namespace {
 // Makes the task known to all that it has to wait for, to its buffers and to its queue.
 void link_task(detail::task& task, const std::vector<detail::task_ref>& dependencies,
-               detail::queue_core& core) {
+               detail::queue_core& core, detail::fence_kind fence) {
   for (const detail::task_ref& dependency : dependencies) {
     task.depend_on(*dependency.get());
   }
+  const auto add = [&] {
+    if (fence == detail::fence_kind::none) {
+      core.add(task);
+    } else {
+      core.add_barrier(task, fence == detail::fence_kind::after_all);
+    }
+  };
   if (task.accesses().empty()) {
-    core.add(task);
+    add();
   } else {
     const std::lock_guard<std::mutex> lock(detail::access_record::order_mutex());
     for (const detail::access_request& access : task.accesses()) {
       access.core->record().add(task, access.writes);
     }
-    core.add(task);
+    add();
   }
 }
 }  // namespace
@@ -212,10 +304,11 @@ void link_task(detail::task& task, const std::vector<detail::task_ref>& dependen
 event handler::finish() {
   detail::queue_core& core = *group_.queue;
   const std::vector<detail::task_ref> dependencies = std::move(group_.dependencies);
+  const detail::fence_kind fence = group_.fence;
   auto* task = new detail::task(core.shared_from_this(), std::move(group_));
   event result = detail::event_access::make(detail::share(*task));
   try {
-    link_task(*task, dependencies, core);
+    link_task(*task, dependencies, core, fence);
   } catch (...) {  // out of memory
     task->abandon();
     throw;

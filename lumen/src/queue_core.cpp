@@ -3,8 +3,10 @@
 #include "queue_core.hpp"
 
 #include <cstdio>
+#include <thread>
 
 #include "clock.hpp"
+#include "completer.hpp"
 #include "device_record.hpp"
 
 LUMEN_NAMESPACE_BEGIN
@@ -27,23 +29,44 @@ namespace {
 }  // namespace
 
 queue_core::queue_core(const context& owner, const device& where, const async_handler& handler,
-                       const property_list& wanted)
+                       const property_list& wanted, std::unique_ptr<command_stream> given)
     : ctx(owner),
       dev(where),
       record(device_record::of(where)),
       properties(wanted),
       in_order(detail::property_access::has<property::queue::in_order>(wanted)),
       profiling(detail::property_access::has<property::queue::enable_profiling>(wanted)),
-      stream(record.driver->make_stream(record, profiling)),
+      place(context_state::of(owner).place_of(where)),
+      stream(given != nullptr ? std::move(given) : record.driver->make_stream(*place, profiling)),
       handler_(handler ? handler : context_state::of(owner).handler) {}
 
 void queue_core::add(task& added) {
-  if (profiling) {
-    added.submit_time.store(now_nanoseconds(), std::memory_order_relaxed);
-  }
   const std::lock_guard<std::mutex> lock(mutex_);
   if (in_order && last_ != nullptr) {
     added.depend_on(*last_);
+  }
+  if (barrier_) {
+    added.depend_on(*barrier_.get());
+  }
+  append(added);
+}
+
+void queue_core::add_barrier(task& added, bool after_all) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  for (task* before = after_all || in_order ? first_ : nullptr; before != nullptr;
+       before = before->queue_next) {
+    added.depend_on(*before);
+  }
+  if (barrier_) {
+    added.depend_on(*barrier_.get());
+  }
+  barrier_ = share(added);
+  append(added);
+}
+
+void queue_core::append(task& added) {
+  if (profiling) {
+    added.submit_time.store(now_nanoseconds(), std::memory_order_relaxed);
   }
   added.in_queue = true;
   added.queue_previous = last_;
@@ -57,6 +80,9 @@ void queue_core::remove(task& finished) {
       finished.queue_next;
   (finished.queue_next != nullptr ? finished.queue_next->queue_previous : last_) =
       finished.queue_previous;
+  if (barrier_.get() == &finished) {
+    barrier_ = task_ref();  // they hold each other
+  }
 }
 
 void queue_core::wait() {
@@ -98,6 +124,22 @@ void queue_core::abandon() {
     abandoned_ = true;
   }
   throw_asynchronous();
+}
+
+queue_handle::~queue_handle() {
+  core->abandon();
+  core->settle();
+}
+
+void queue_core::settle() const {
+  // Within a task, or within a parting, the caller may be what they wait for.
+  if (!record.detached || task::depth_of_this_thread() != 0 || parting::on_this_thread()) {
+    return;
+  }
+  completer::instance().settle(*this);
+  while (partings->load(std::memory_order_acquire) != 0) {
+    std::this_thread::yield();
+  }
 }
 
 void queue_core::call_handler(std::vector<std::exception_ptr> errors) {

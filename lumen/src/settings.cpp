@@ -127,7 +127,7 @@ virtual_device_parse parse_virtual_devices(const std::string& text) {
 const std::vector<virtual_device_setting>& virtual_devices_from_environment() {
   static const auto& devices = *new std::vector<virtual_device_setting>([] {
     const char* text = std::getenv("LUMEN_VIRTUAL_DEVICES");
-    if (text == nullptr || *text == '\0') {
+    if (text == nullptr || *text == '\0' || !backends_from_environment().virtual_devices) {
       return std::vector<virtual_device_setting>();
     }
     virtual_device_parse result = parse_virtual_devices(text);
@@ -139,6 +139,45 @@ const std::vector<virtual_device_setting>& virtual_devices_from_environment() {
     return std::move(result.devices);
   }());
   return devices;
+}
+
+backend_parse parse_backends(const std::string& text) {
+  backend_parse result;
+  if (text.empty()) {
+    return result;
+  }
+  for (const piece& name : split({text, 1}, ';')) {
+    if (name.text == "virtual") {
+      result.choice.virtual_devices = true;
+    } else if (name.text == "cuda") {
+      result.choice.cuda = true;
+    } else if (name.text == "opencl") {
+      result.choice.opencl = true;
+    } else if (name.text == "level_zero") {
+      result.choice.level_zero = true;
+    } else {
+      return {{}, "unknown backend '" + name.text + "'", name.column};
+    }
+  }
+  return result;
+}
+
+backend_choice backends_from_environment() {
+  static const backend_choice choice = [] {
+    constexpr backend_choice all{true, true, true, true};
+    const char* text = std::getenv("LUMEN_BACKENDS");
+    if (text == nullptr) {
+      return all;
+    }
+    const backend_parse result = parse_backends(text);
+    if (!result.error.empty()) {
+      std::fprintf(stderr, "lumen: LUMEN_BACKENDS: column %zu: %s; the variable is ignored\n",
+                   result.column, result.error.c_str());
+      return all;
+    }
+    return result.choice;
+  }();
+  return choice;
 }
 
 bool cuda_shared_is_managed() {

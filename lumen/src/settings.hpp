@@ -40,5 +40,21 @@ const std::vector<virtual_device_setting>& virtual_devices_from_environment();
 // between host and device by pages, otherwise (pinned) memory of the host that the device reaches.
 bool cuda_shared_is_managed();
 
+// The optional backends that are used: LUMEN_BACKENDS, a list of virtual, cuda, opencl and
+// level_zero separated by ';'. All where it is not set.
+struct backend_choice {
+  bool virtual_devices = false;
+  bool cuda = false;
+  bool opencl = false;
+  bool level_zero = false;
+};
+struct backend_parse {
+  backend_choice choice;
+  std::string error;  // empty: none
+  std::size_t column = 0;
+};
+backend_parse parse_backends(const std::string& text);
+backend_choice backends_from_environment();
+
 }  // namespace detail
 LUMEN_NAMESPACE_END

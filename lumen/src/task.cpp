@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <chrono>
 #include <new>
+#include <thread>
 
 #include "access_record.hpp"
 #include "backend.hpp"
@@ -59,7 +60,8 @@ task::task(std::shared_ptr<queue_core> queue, command_group&& group)
     : queue_(std::move(queue)),
       kind_(group.kind),
       streamed_(goes_through_stream(kind_, queue_.get(), group.accesses)),
-      ends_on_host_(streamed_ && static_cast<device_command&>(*group.work).ends_on_host()),
+      ends_on_host_(streamed_ && group.work != nullptr &&
+                    static_cast<device_command&>(*group.work).ends_on_host()),
       shape_(group.shape),
       work_(std::move(group.work)),
       accesses_(std::move(group.accesses)) {}
@@ -103,7 +105,7 @@ void task::abandon() noexcept {
 // Whether the device itself keeps this task behind the other.
 bool task::follows(const task& other) const noexcept {
   return streamed_ && other.streamed_ && !other.ends_on_host_ &&
-         queue_->record.driver == other.queue_->record.driver;
+         reach_each_other(*queue_->place, *other.queue_->place);
 }
 
 void task::dependency_done() {
@@ -217,6 +219,9 @@ void task::wait() {
     const auto its = static_cast<task_state>(word & state_mask);
     if (its == task_state::done) {
       if (!last) {
+        if (queue_) {
+          queue_->settle();
+        }
         return;
       }
       last = take_last(path);
@@ -250,9 +255,11 @@ void task::execute() {
     try {
       issue();
     } catch (...) {
-      // What went in before the failure uses what the task is about to give back.
+      // What went in before the failure uses what the task is about to give back, and who comes
+      // after this task counts on what it comes after.
       end_mark_.reset();
       queue_->stream->drain();
+      wait_for_dependencies();
       throw;
     }
   } else if (work_ == nullptr) {
@@ -263,6 +270,38 @@ void task::execute() {
   } else if (kind_ == work_kind::device) {
     static_cast<device_command&>(*work_).enqueue(*queue_->stream, shape_);
   }
+}
+
+void task::wait_for_dependencies() noexcept {
+  for (const task_ref& dependency : dependencies_) {
+    if (dependency->state() == task_state::issued) {
+      try {
+        dependency->end_mark_->wait();
+      } catch (...) {  // told by the dependency itself
+      }
+    }
+  }
+}
+
+namespace {
+thread_local unsigned partings_of_this_thread = 0;
+}
+
+void parting::begin(const queue_core* queue) noexcept {
+  if (!count_ && queue != nullptr && queue->record.detached) {
+    count_ = queue->partings;
+    count_->fetch_add(1, std::memory_order_relaxed);
+    ++partings_of_this_thread;
+  }
+}
+parting::~parting() {
+  if (count_) {
+    --partings_of_this_thread;
+    count_->fetch_sub(1, std::memory_order_release);
+  }
+}
+bool parting::on_this_thread() noexcept {
+  return partings_of_this_thread != 0;
 }
 
 void task::issue() {
@@ -286,7 +325,26 @@ void task::issue() {
   end_mark_ = stream.mark();
 }
 
+void released_tasks::tell() const {
+  for (const task_ref& successor : successors) {
+    successor->dependency_done();
+  }
+  for (const task_ref& follower : followers) {
+    follower->dependency_done();
+  }
+  if (after_the_end) {
+    executor::instance().finished();
+  }
+}
+
 void task::run() {
+  released_tasks released;
+  run_and_part(released);
+  released.tell();
+}
+
+void task::run_and_part(released_tasks& released) {
+  parting last;
   const task_ref self = share(*this);
   running_frame frame{this, innermost, false};
   innermost = &frame;
@@ -301,17 +359,17 @@ void task::run() {
   }
   innermost = frame.outer;
   if (end_mark_) {
-    issued();
+    issued(last, released);
   } else {
-    finish(std::move(error));
+    finish(std::move(error), last, released);
   }
 }
 
-void task::issued() {
-  std::vector<task_ref> followers;
+void task::issued(parting& last, released_tasks& released) {
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    followers.swap(followers_);
+    released.followers.swap(followers_);
+    last.begin(queue_.get());
     set_state(task_state::issued);
   }
   if (executor::instance().stopped()) {
@@ -319,8 +377,23 @@ void task::issued() {
   } else {
     completer::instance().add(*this);
   }
-  for (const task_ref& follower : followers) {
-    follower->dependency_done();
+}
+
+std::shared_ptr<stream_mark> task::wait_for_mark() {
+  executor& threads = executor::instance();
+  for (;;) {
+    const task_state its = state();
+    if (its == task_state::issued || its == task_state::done) {
+      return end_mark_;
+    }
+    if (its == task_state::ready && threads.claim(*this)) {
+      run();
+    } else if (const task_ref before =
+                   its == task_state::pending ? open_dependency() : task_ref()) {
+      before->wait();
+    } else {
+      std::this_thread::yield();
+    }
   }
 }
 
@@ -339,6 +412,14 @@ task_ref task::issued_before() {
 }
 
 bool task::finish_issued() {
+  released_tasks released;
+  const bool ended = finish_issued_and_part(released);
+  released.tell();
+  return ended;
+}
+
+bool task::finish_issued_and_part(released_tasks& released) {
+  parting last;
   const task_ref self = share(*this);
   std::exception_ptr error;
   try {
@@ -349,7 +430,12 @@ bool task::finish_issued() {
   if (finishing_.exchange(true)) {
     return false;
   }
-  finish(std::move(error));
+  if (error && !end_mark_->reached()) {
+    // The device is still at work on what the task is about to give back.
+    const std::lock_guard<std::mutex> lock(queue_->issue_mutex);
+    queue_->stream->drain();
+  }
+  finish(std::move(error), last, released);
   return true;
 }
 
@@ -364,7 +450,7 @@ void task::note_times() {
 }
 
 // The work is over: tells of its error, gives back what it held, and lets go what comes after.
-void task::finish(std::exception_ptr error) {
+void task::finish(std::exception_ptr error, parting& last, released_tasks& released) {
   const task_ref self = share(*this);
   running_frame frame{this, innermost, false};
   innermost = &frame;
@@ -372,7 +458,8 @@ void task::finish(std::exception_ptr error) {
     if (!error && kind_ == work_kind::device && work_ != nullptr) {
       static_cast<device_command&>(*work_).finish();
     }
-    if (queue_ && queue_->profiling) {
+    // A command that failed may have no times.
+    if (queue_ && queue_->profiling && !(error && end_mark_)) {
       note_times();
     }
   } catch (...) {
@@ -389,23 +476,19 @@ void task::finish(std::exception_ptr error) {
   if (in_queue) {
     queue_->remove(*this);
   }
-  std::vector<task_ref> successors;
-  std::vector<task_ref> followers;
   std::vector<task_ref> dependencies;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    successors.swap(successors_);
-    followers.swap(followers_);
+    released.successors.swap(successors_);
+    released.followers.swap(followers_);
+    released.after_the_end = true;
     dependencies.swap(dependencies_);
+    last.begin(queue_.get());
     set_state(task_state::done);
   }
-  for (const task_ref& successor : successors) {
-    successor->dependency_done();
+  if (end_mark_) {
+    completer::instance().remove(*this);
   }
-  for (const task_ref& follower : followers) {
-    follower->dependency_done();
-  }
-  executor::instance().finished();
   release();  // the count that kept the task alive while it was unfinished
 }
 

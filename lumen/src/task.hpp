@@ -22,6 +22,31 @@ namespace detail {
 class executor;
 class stream_mark;
 
+// Counted in a queue while a thread lets go of a task of it that is done, or is with the device:
+// the task may be the last that holds the queue, and what stands behind it.
+class parting {
+ public:
+  parting() = default;
+  parting(const parting&) = delete;
+  parting& operator=(const parting&) = delete;
+  ~parting();
+  void begin(const queue_core* queue) noexcept;
+  // Whether the calling thread is within one: it must not wait for those of others.
+  static bool on_this_thread() noexcept;
+
+ private:
+  std::shared_ptr<std::atomic<int>> count_;
+};
+
+// What a task lets go. It is told after the parting, since it may begin on the same thread.
+struct released_tasks {
+  std::vector<task_ref> successors;
+  std::vector<task_ref> followers;
+  bool after_the_end = false;  // of the task; else it is issued
+
+  void tell() const;
+};
+
 enum class task_state : std::uint32_t { pending, ready, running, issued, done };
 
 class task {
@@ -54,6 +79,8 @@ class task {
   void wait();
   // Runs a claimed task to its end, or into its stream, on the calling thread.
   void run();
+  // The end of the work in the stream, as soon as the work is there; null where there is none.
+  std::shared_ptr<stream_mark> wait_for_mark();
   // Whether the stream has done an issued task.
   bool reached() const noexcept;
   // Waits until the stream has done an issued task, and ends the task unless another thread is at
@@ -82,6 +109,8 @@ class task {
   task* ready_next = nullptr;
   task* ready_previous = nullptr;
   std::uint64_t ticket = 0;
+  // Whether the completer's list has it, whose links are the same; guarded by the completer.
+  bool watched = false;
   // Links of the queue's list of unfinished tasks, guarded by the queue.
   bool in_queue = false;
   task* queue_next = nullptr;
@@ -89,6 +118,7 @@ class task {
 
  private:
   friend class executor;
+  friend struct released_tasks;
   static constexpr std::uint32_t state_mask = 7;
   static constexpr std::uint32_t waited_bit = 8;
   static constexpr std::uint32_t linked_bit = 16;
@@ -96,8 +126,11 @@ class task {
   bool follows(const task& other) const noexcept;
   void execute();
   void issue();
-  void issued();
-  void finish(std::exception_ptr error);
+  void wait_for_dependencies() noexcept;
+  void run_and_part(released_tasks& released);
+  bool finish_issued_and_part(released_tasks& released);
+  void issued(parting& last, released_tasks& released);
+  void finish(std::exception_ptr error, parting& last, released_tasks& released);
   void note_times();
   void dependency_done();
   void set_state(task_state next) noexcept;

@@ -17,7 +17,7 @@ namespace {
 struct allocation {
   std::size_t bytes;
   usm::alloc kind;
-  const detail::device_record* device;
+  std::shared_ptr<const detail::memory_place> place;
   std::shared_ptr<detail::context_state> owner;
 };
 
@@ -57,7 +57,7 @@ class allocation_table {
     if (address(pointer) - place->first >= entry.bytes || entry.owner.get() != &owner) {
       return {usm::alloc::unknown, nullptr};
     }
-    return {entry.kind, entry.device};
+    return {entry.kind, &entry.place->device};
   }
 
  private:
@@ -70,27 +70,35 @@ class allocation_table {
 
 constexpr std::size_t least_alignment = 64;
 
+aspect aspect_of(usm::alloc kind) {
+  return kind == usm::alloc::device ? aspect::usm_device_allocations
+         : kind == usm::alloc::host ? aspect::usm_host_allocations
+                                    : aspect::usm_shared_allocations;
+}
+
 }  // namespace
 
 void* aligned_alloc(std::size_t alignment, std::size_t bytes, const device& dev, const context& ctx,
                     usm::alloc kind, const property_list&) {
   const auto& owner = detail::context_state::shared(ctx);
-  if (std::find(owner->devices.begin(), owner->devices.end(), dev) == owner->devices.end()) {
-    throw exception(make_error_code(errc::invalid), "the device is not of the context");
+  const std::shared_ptr<detail::memory_place>& place = owner->place_of(dev);
+  const detail::device_record& record = place->device;
+  if (kind != usm::alloc::unknown && !dev.has(aspect_of(kind))) {
+    throw exception(make_error_code(errc::feature_not_supported),
+                    record.properties.name + " has no unified shared memory of this kind");
   }
-  const detail::device_record& record = detail::device_record::of(dev);
   const bool power_of_two = (alignment & (alignment - 1)) == 0;
   if (bytes == 0 || !power_of_two || kind == usm::alloc::unknown ||
       bytes > record.properties.max_mem_alloc_size || alignment > bytes + (std::size_t{1} << 30)) {
     return nullptr;
   }
   void* pointer =
-      record.driver->allocate(record, kind, std::max(alignment, least_alignment), bytes);
+      record.driver->allocate(*place, kind, std::max(alignment, least_alignment), bytes);
   if (pointer != nullptr) {
     try {
-      allocation_table::instance().add(pointer, {bytes, kind, &record, owner});
+      allocation_table::instance().add(pointer, {bytes, kind, place, owner});
     } catch (...) {
-      record.driver->release(record, kind, pointer);
+      record.driver->release(*place, kind, pointer);
       throw;
     }
   }
@@ -103,11 +111,11 @@ void free(void* pointer, const context& ctx) {
   }
   const allocation entry =
       allocation_table::instance().take(pointer, detail::context_state::of(ctx));
-  if (entry.device == nullptr) {
+  if (entry.place == nullptr) {
     throw exception(make_error_code(errc::invalid),
                     "free: no allocation of the context begins at the pointer");
   }
-  entry.device->driver->release(*entry.device, entry.kind, pointer);
+  entry.place->device.driver->release(*entry.place, entry.kind, pointer);
 }
 
 usm::alloc get_pointer_type(const void* pointer, const context& ctx) {

@@ -4,6 +4,7 @@
 
 #include "detail/accessor.hpp"
 #include "detail/atomic_ref.hpp"
+#include "detail/backend.hpp"
 #include "detail/bit.hpp"
 #include "detail/buffer.hpp"
 #include "detail/builtins.hpp"
@@ -16,6 +17,7 @@
 #include "detail/functional.hpp"
 #include "detail/group_algorithms.hpp"
 #include "detail/handler.hpp"
+#include "detail/kernel.hpp"
 #include "detail/local_accessor.hpp"
 #include "detail/multi_ptr.hpp"
 #include "detail/nd_item.hpp"

@@ -178,28 +178,28 @@ class cuda_driver final : public backend_driver {
 
   // Device memory is aligned to 256 bytes and pinned memory to a page; for more, a larger block is
   // taken, and its start kept.
-  void* allocate(const device_record& device, usm::alloc kind, std::size_t alignment,
+  void* allocate(const memory_place& place, usm::alloc kind, std::size_t alignment,
                  std::size_t bytes) override {
     const std::size_t plain = kind == usm::alloc::device ? 256 : 4096;
     if (alignment <= plain) {
-      return take(device, kind, bytes);
+      return take(place.device, kind, bytes);
     }
-    void* const block = take(device, kind, bytes + alignment);
+    void* const block = take(place.device, kind, bytes + alignment);
     if (block == nullptr) {
       return nullptr;
     }
     const auto start = reinterpret_cast<std::uintptr_t>(block);
-    void* const place = static_cast<char*>(block) + (alignment - start % alignment) % alignment;
+    void* const aligned = static_cast<char*>(block) + (alignment - start % alignment) % alignment;
     try {
       const std::lock_guard<std::mutex> lock(mutex_);
-      blocks_[place] = block;
+      blocks_[aligned] = block;
     } catch (...) {
-      give_back(device, kind, block);
+      give_back(place.device, kind, block);
       throw;
     }
-    return place;
+    return aligned;
   }
-  void release(const device_record& device, usm::alloc kind, void* pointer) noexcept override {
+  void release(const memory_place& place, usm::alloc kind, void* pointer) noexcept override {
     {
       const std::lock_guard<std::mutex> lock(mutex_);
       const auto found = blocks_.find(pointer);
@@ -208,15 +208,15 @@ class cuda_driver final : public backend_driver {
         blocks_.erase(found);
       }
     }
-    give_back(device, kind, pointer);
+    give_back(place.device, kind, pointer);
   }
 
-  std::unique_ptr<command_stream> make_stream(const device_record& device, bool timed) override {
-    return std::make_unique<cuda_stream>(device, timed);
+  std::unique_ptr<command_stream> make_stream(const memory_place& place, bool timed) override {
+    return std::make_unique<cuda_stream>(place.device, timed);
   }
-  void copy(const device_record& device, void* to, const void* from, std::size_t bytes) override {
+  void copy(const memory_place& place, void* to, const void* from, std::size_t bytes) override {
     if (bytes != 0) {
-      use(device);
+      use(place.device);
       check_cuda(cudaMemcpy(to, from, bytes, cudaMemcpyDefault), "cudaMemcpy");
     }
   }

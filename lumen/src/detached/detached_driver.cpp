@@ -145,8 +145,8 @@ class detached_stream final : public command_stream {
 class detached_driver final : public host_memory_driver {
  public:
   std::vector<std::unique_ptr<device_record>> enumerate() override { return detached_devices(); }
-  std::unique_ptr<command_stream> make_stream(const device_record& device, bool) override {
-    return std::make_unique<detached_stream>(device);
+  std::unique_ptr<command_stream> make_stream(const memory_place& place, bool) override {
+    return std::make_unique<detached_stream>(place.device);
   }
 };
 

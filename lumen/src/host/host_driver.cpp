@@ -78,22 +78,22 @@ class host_stream final : public command_stream {
 class host_driver final : public host_memory_driver {
  public:
   std::vector<std::unique_ptr<device_record>> enumerate() override { return host_devices(); }
-  std::unique_ptr<command_stream> make_stream(const device_record& device, bool) override {
-    return std::make_unique<host_stream>(device);
+  std::unique_ptr<command_stream> make_stream(const memory_place& place, bool) override {
+    return std::make_unique<host_stream>(place.device);
   }
 };
 
 }  // namespace
 
-void* host_memory_driver::allocate(const device_record&, usm::alloc, std::size_t alignment,
+void* host_memory_driver::allocate(const memory_place&, usm::alloc, std::size_t alignment,
                                    std::size_t bytes) {
   void* pointer = nullptr;
   return posix_memalign(&pointer, alignment, bytes) == 0 ? pointer : nullptr;
 }
-void host_memory_driver::release(const device_record&, usm::alloc, void* pointer) noexcept {
+void host_memory_driver::release(const memory_place&, usm::alloc, void* pointer) noexcept {
   std::free(pointer);
 }
-void host_memory_driver::copy(const device_record&, void* to, const void* from, std::size_t bytes) {
+void host_memory_driver::copy(const memory_place&, void* to, const void* from, std::size_t bytes) {
   copy_bytes(to, from, bytes);
 }
 

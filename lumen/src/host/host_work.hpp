@@ -12,10 +12,10 @@ namespace detail {
 // Backends whose devices have their memory in the host's.
 class host_memory_driver : public backend_driver {
  public:
-  void* allocate(const device_record& device, usm::alloc kind, std::size_t alignment,
+  void* allocate(const memory_place& place, usm::alloc kind, std::size_t alignment,
                  std::size_t bytes) override;
-  void release(const device_record& device, usm::alloc kind, void* pointer) noexcept override;
-  void copy(const device_record& device, void* to, const void* from, std::size_t bytes) override;
+  void release(const memory_place& place, usm::alloc kind, void* pointer) noexcept override;
+  void copy(const memory_place& place, void* to, const void* from, std::size_t bytes) override;
 };
 
 void copy_bytes(void* to, const void* from, std::size_t bytes);

@@ -19,7 +19,7 @@ class handler;
 namespace detail {
 class access_record;
 class buffer_copies;
-struct device_record;
+struct memory_place;
 
 // What a user does to the contents: one that does not keep them reads nothing of what was there.
 struct access_kind {
@@ -39,10 +39,10 @@ class LUMEN_EXPORT buffer_core : public std::enable_shared_from_this<buffer_core
 
   // Makes the host's memory current for a user that is about to begin.
   void to_host(access_kind use);
-  // The copy on a device with memory of its own, made at first use; errc::memory_allocation.
-  void* address_on(const device_record& device);
-  // The host's address for one in the copy on a device; others stay as they are.
-  void* host_address(const device_record& device, void* address);
+  // The copy in a place that is not the host's memory, made at first use; errc::memory_allocation.
+  void* address_on(const memory_place& place);
+  // The host's address for one in the copy in a place; others stay as they are.
+  void* host_address(const memory_place& place, void* address);
   // To be asked for only after address_on.
   buffer_copies& copies() const { return *made_copies(); }
   // There are contents: somebody has written them, or is about to.

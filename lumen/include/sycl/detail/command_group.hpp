@@ -9,6 +9,7 @@
 
 #include "command.hpp"
 #include "event.hpp"
+#include "native_argument.hpp"
 
 LUMEN_NAMESPACE_BEGIN
 
@@ -16,17 +17,19 @@ namespace detail {
 
 class buffer_core;
 class queue_core;
-struct device_record;
+struct memory_place;
 
 // The task keeps the memory, even of a buffer that dies inside its command group function.
 struct access_request {
   std::shared_ptr<buffer_core> core;
   bool writes;
-  bool keeps;                  // false: what was there before is not read
-  const device_record* place;  // whose copy is used; null: the host's
+  bool keeps;                 // false: what was there before is not read
+  const memory_place* place;  // whose copy is used; null: the host's
 };
 
 enum class work_kind : char { none, host, device };
+// Whether later command groups of the queue come after this one, and this one after all earlier.
+enum class fence_kind : char { none, after_dependencies, after_all };
 
 struct command_group {
   queue_core* queue = nullptr;
@@ -34,6 +37,8 @@ struct command_group {
   std::unique_ptr<command> work;
   launch_shape shape;
   std::size_t local_bytes = 0;
+  fence_kind fence = fence_kind::none;
+  std::vector<kernel_argument> arguments;  // of a native kernel
   std::vector<task_ref> dependencies;
   std::vector<access_request> accesses;
 };

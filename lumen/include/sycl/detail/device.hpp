@@ -67,6 +67,7 @@ class LUMEN_EXPORT platform {
 
  private:
   friend class device;
+  friend struct detail::device_record;
   friend struct std::hash<platform>;
   explicit platform(const detail::platform_record* record) : record_(record) {}
   const detail::platform_record* record_;

@@ -17,6 +17,7 @@
 
 LUMEN_NAMESPACE_BEGIN
 
+class kernel;
 class queue;
 
 namespace detail {
@@ -61,12 +62,44 @@ class LUMEN_EXPORT handler {
     placeholder.bind(*this);
   }
 
-  // Nothing is passed by position here: lambdas and functors carry their own arguments.
+  // Arguments by position are those of native kernels; lambdas and functors carry their own. What
+  // is not set keeps the value of an earlier launch. An argument is a value of bytes, a pointer
+  // into unified shared memory, an accessor (the start of its buffer) or a local accessor.
+  template <typename T>
+  void set_arg(int index, const T& argument) {
+    if constexpr (detail::is_accessor<T>) {
+      set_pointer(index, argument.get_pointer());
+    } else if constexpr (detail::is_local_accessor<T>) {
+      set_local(index, argument.byte_size());
+    } else if constexpr (std::is_pointer_v<T>) {
+      set_pointer(index, argument);
+    } else {
+      static_assert(std::is_trivially_copyable_v<T>, "an argument of a kernel is a value of bytes");
+      set_value(index, &argument, sizeof(T));
+    }
+  }
+  template <typename... Ts>
+  void set_args(const Ts&... arguments) {
+    int index = 0;
+    (set_arg(index++, arguments), ...);
+  }
+
+  // Later command groups of the queue come after this one. It comes after all earlier ones, or
+  // after the given events alone; waiting for it waits for them.
+  void ext_kestrel_barrier();
+  void ext_kestrel_barrier(const std::vector<event>& events);
+
+  // In each launch a native kernel may stand for the function; throws errc::invalid when it is not
+  // of the queue's context.
   template <typename KernelName = void, typename Function>
   void single_task(const Function& function) {
-    detail::check_kernel_type<Function>();
-    launch(detail::shape_of(range<1>(1), id<1>()),
-           std::make_unique<detail::single_kernel<Function>>(function));
+    if constexpr (std::is_same_v<Function, kernel>) {
+      launch_native(detail::shape_of(range<1>(1), id<1>()), true, function);
+    } else {
+      detail::check_kernel_type<Function>();
+      launch(detail::shape_of(range<1>(1), id<1>()),
+             std::make_unique<detail::single_kernel<Function>>(function));
+    }
   }
 
   // Launches throw errc::kernel_not_supported when the program has no code of the kernel for the
@@ -172,17 +205,29 @@ class LUMEN_EXPORT handler {
   }
   template <int Dimensions, typename Function>
   void launch_range(range<Dimensions> sizes, id<Dimensions> offset, const Function& function) {
-    detail::check_kernel_type<Function>();
-    launch(detail::shape_of(sizes, offset),
-           std::make_unique<detail::range_kernel<Dimensions, Function>>(sizes, offset, function));
+    if constexpr (std::is_same_v<Function, kernel>) {
+      launch_native(detail::shape_of(sizes, offset), false, function);
+    } else {
+      detail::check_kernel_type<Function>();
+      launch(detail::shape_of(sizes, offset),
+             std::make_unique<detail::range_kernel<Dimensions, Function>>(sizes, offset, function));
+    }
   }
   template <int Dimensions, typename Function>
   void launch_groups(const nd_range<Dimensions>& ranges, const Function& function) {
-    detail::check_kernel_type<Function>();
-    launch(detail::shape_of(ranges),
-           std::make_unique<detail::nd_range_kernel<Dimensions, Function>>(function));
+    if constexpr (std::is_same_v<Function, kernel>) {
+      launch_native(detail::shape_of(ranges), true, function);
+    } else {
+      detail::check_kernel_type<Function>();
+      launch(detail::shape_of(ranges),
+             std::make_unique<detail::nd_range_kernel<Dimensions, Function>>(function));
+    }
   }
   void launch(const detail::launch_shape& shape, std::unique_ptr<detail::kernel_command> work);
+  void launch_native(const detail::launch_shape& shape, bool grouped, const kernel& native);
+  void set_value(int index, const void* value, std::size_t bytes);
+  void set_pointer(int index, const void* pointer);
+  void set_local(int index, std::size_t bytes);
   void run_on_host(std::unique_ptr<detail::host_command> work);
   void run_on_device(std::unique_ptr<detail::device_command> work);
   void fill_bytes(void* pointer, const void* pattern, std::size_t pattern_bytes, std::size_t count);

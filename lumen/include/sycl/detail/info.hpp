@@ -17,7 +17,9 @@ class platform;
 class device;
 class context;
 
-enum class backend : char { host, cuda, opencl, level_zero };
+// The numbers are those that siblings in other languages pass. Where the host runs the kernels, on
+// the CPU and on virtual devices, the backend is host.
+enum class backend : char { host = 0, opencl = 1, ext_kestrel_level_zero = 2, cuda = 3 };
 
 enum class aspect {
   cpu,

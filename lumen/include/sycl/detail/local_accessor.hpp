@@ -81,4 +81,11 @@ class local_accessor {
   std::size_t place_ = 0;
 };
 
+namespace detail {
+template <typename T>
+inline constexpr bool is_local_accessor = false;
+template <typename T, int Dimensions>
+inline constexpr bool is_local_accessor<local_accessor<T, Dimensions>> = true;
+}  // namespace detail
+
 LUMEN_NAMESPACE_END

@@ -14,8 +14,9 @@
 LUMEN_NAMESPACE_BEGIN
 
 namespace detail {
+struct native_access;
 struct queue_handle;
-}
+}  // namespace detail
 
 class LUMEN_EXPORT queue {
  public:
@@ -117,6 +118,14 @@ class LUMEN_EXPORT queue {
     return launch<KernelName>(ranges, rest...);
   }
 
+  // As handler::ext_kestrel_barrier.
+  event ext_kestrel_submit_barrier() {
+    return submit([](handler& h) { h.ext_kestrel_barrier(); });
+  }
+  event ext_kestrel_submit_barrier(const std::vector<event>& events) {
+    return submit([&](handler& h) { h.ext_kestrel_barrier(events); });
+  }
+
   // The commands of handler by their names: ARGUMENTS, then optionally an event or a vector of
   // events to come after.
   event memcpy(void* to, const void* from, std::size_t bytes, const std::vector<event>& after = {});
@@ -185,6 +194,8 @@ class LUMEN_EXPORT queue {
 
  private:
   friend struct std::hash<queue>;
+  friend struct detail::native_access;
+  explicit queue(std::shared_ptr<detail::queue_handle> handle) : handle_(std::move(handle)) {}
 
   template <typename KernelName, typename Ranges, typename First, typename... Rest>
   event launch(Ranges ranges, const First& first, const Rest&... rest) {
