@@ -6,7 +6,7 @@ include(CMakePackageConfigHelpers)
 
 # The core is installed because the others are linked to it; its header is no public one.
 set(TARN_INSTALLED tarn_core tarn_statistics tarn_rng tarn_sycl)
-install(DIRECTORY rng/include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+install(DIRECTORY rng/include/ service/include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 install(FILES statistics/include/tarn_rvx.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 if(TARN_SYCL STREQUAL "lumen")
   # Below a folder of its own, so that it never hides another SYCL's headers.

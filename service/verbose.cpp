@@ -1,15 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 // The verbose report. The core library holds the mode, the banner and the road to the output; here
-// is what needs SYCL: device time from the profiling stamps of events.
+// is what needs SYCL: the device, and its time from the profiling stamps of events.
 #include "verbose.hpp"
 
 #include <algorithm>
 #include <atomic>
 #include <cstdint>
 #include <limits>
-#include <string>
 #include <tarn_serv.h>
 #include <vector>
+
+#include "detected_devices.hpp"
+#include "report_text.hpp"
 
 namespace kestrel::tarn::gpu {
 namespace {
@@ -21,7 +23,7 @@ struct verbose_thread_state {
 
 thread_local verbose_thread_state state;
 
-std::atomic<int> verbose_iface{2};  // the C++ interface, until set_verbose_gpu_iface(1)
+std::atomic<int> verbose_iface{2};  // SYCL, until set_verbose_gpu_iface(1)
 
 /// From the start of the first to the end of the last kernel, in seconds; 0 without events. Stamps
 /// are in nanoseconds.
@@ -39,10 +41,10 @@ double take_device_seconds() {
   return end >= start ? static_cast<double>(end - start) * 1e-9 : 0.0;
 }
 
-std::string time_text(double seconds) {
-  char text[64];
-  tarn_serv_format_seconds(text, sizeof text, seconds);
-  return text;
+void append_time(report_text& text, const char* name, double seconds) {
+  char time[32];
+  tarn_serv_format_seconds(time, sizeof time, seconds);
+  text.append("%s%s", name, time);
 }
 
 /// A kernel that does nothing but require the buffer.
@@ -88,13 +90,18 @@ void set_verbose_gpu_iface(int value) {
 }
 
 void print_verbose_gpu_info(sycl::queue* queue, const char* text, double host_seconds) {
-  static_cast<void>(queue);  // names the device once the device tables are there
-  if (state.depth != 0 || *tarn_serv_verbose_mode() == 0) {
+  if (state.depth != 0 || *tarn_serv_verbose_mode() <= 0) {
     return;
   }
   tarn_serv_print_verbose_header(verbose_iface);
-  const std::string times =
-      "host:" + time_text(host_seconds) + " device:" + time_text(take_device_seconds());
+  report_detected_devices(*queue);
+  report_text times;
+  append_time(times, "host:", host_seconds);
+  append_time(times, " device:", take_device_seconds());
+  const int position = detected_position(queue->get_device());
+  if (position >= 0) {
+    times.append(" GPU%d", position);
+  }
   tarn_serv_print_verbose_line(text, times.c_str());
 }
 

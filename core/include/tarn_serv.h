@@ -140,7 +140,8 @@ TARN_SERV_API void* tarn_serv_find_symbol(void* module, const char* name);
 
 /** \defgroup serv_end The end of the process
  * \{ */
-/** Decides about the end of the process with status `code`. */
+/** Decides about the end of the process with status `code`: it returns, or ends the process without
+ * running exit functions (_exit, abort), since its caller may hold locks that they take. */
 typedef void (*tarn_serv_exit_hook)(int code);
 /** Sets who decides about tarn_serv_exit; NULL brings the default back. Returns the former hook. */
 TARN_SERV_API tarn_serv_exit_hook tarn_serv_set_exit_hook(tarn_serv_exit_hook hook);

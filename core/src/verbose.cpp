@@ -45,6 +45,8 @@ const char* interface_name(int iface) {
   }
 }
 
+int stdout_lock = 0;  // one line of the console after the other; the file needs none
+
 void print_banner(int iface) {
   std::string line = "TARN_VERBOSE Tarn RNG " TARN_VERSION ", processor: ";
   line.append(processor_name());
@@ -101,5 +103,7 @@ void tarn_serv_print_verbose_text(const char* text) {
     tarn_serv_format_print(channel::warning, "TARN_VERBOSE WARNING: %s\n", 1,
                            "unable to open output file. Print to STDOUT");
   }
+  tarn_serv_lock(&stdout_lock);
   tarn_serv_format_print(channel::normal, "%s", 1, text);
+  tarn_serv_unlock(&stdout_lock);
 }

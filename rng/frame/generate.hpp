@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <type_traits>
 #include <vector>
 
 #include <kestrel/tarn/exceptions.hpp>
@@ -58,6 +59,24 @@ template <typename Distr, typename Engine, typename Out>
   }
 }
 
+/// The same with a report around it; of its own, so that what reports need costs the entry nothing
+/// while they are off.
+template <typename Distr, typename Engine, typename Out>
+[[gnu::noinline, gnu::cold]] sycl::event generate_reported(
+    const Distr& distr, Engine& engine, std::int64_t n, Out r,
+    const std::vector<sycl::event>& dependencies) {
+  const auto frame = [&] {
+    return generate_on_device<Distr, Engine, Out>(distr, engine, n, r, dependencies);
+  };
+  const reported_call call = describe_call<Distr>(engine, n, frame);
+  if constexpr (std::is_pointer_v<Out>) {
+    return run_reported(call, r, dependencies);
+  } else {
+    run_reported(call, r);
+    return {};
+  }
+}
+
 }  // namespace kestrel::tarn::rng::detail
 
 namespace kestrel::tarn::rng {
@@ -65,28 +84,22 @@ namespace kestrel::tarn::rng {
 template <typename Distr, typename Engine>
 sycl::event generate(const Distr& distr, Engine& engine, std::int64_t n,
                      typename Distr::result_type* r, const std::vector<sycl::event>& dependencies) {
-  const auto frame = [&] {
-    return detail::generate_on_device<Distr, Engine, typename Distr::result_type*>(distr, engine, n,
-                                                                                   r, dependencies);
-  };
-  if (!detail::is_verbose()) {
-    return frame();
+  using Out = typename Distr::result_type*;
+  if (detail::is_verbose()) {
+    return detail::generate_reported<Distr, Engine, Out>(distr, engine, n, r, dependencies);
   }
-  return detail::run_reported(detail::describe_call<Distr>(engine, n, frame), r, dependencies);
+  return detail::generate_on_device<Distr, Engine, Out>(distr, engine, n, r, dependencies);
 }
 
 template <typename Distr, typename Engine>
 void generate(const Distr& distr, Engine& engine, std::int64_t n,
               sycl::buffer<typename Distr::result_type, 1>& r) {
-  const auto frame = [&] {
-    return detail::generate_on_device<Distr, Engine, sycl::buffer<typename Distr::result_type, 1>&>(
-        distr, engine, n, r, {});
-  };
-  if (!detail::is_verbose()) {
-    frame();
-    return;
+  using Out = sycl::buffer<typename Distr::result_type, 1>&;
+  if (detail::is_verbose()) {
+    detail::generate_reported<Distr, Engine, Out>(distr, engine, n, r, {});
+  } else {
+    detail::generate_on_device<Distr, Engine, Out>(distr, engine, n, r, {});
   }
-  detail::run_reported(detail::describe_call<Distr>(engine, n, frame), r);
 }
 
 }  // namespace kestrel::tarn::rng

@@ -1,8 +1,9 @@
 # SPDX-License-Identifier: Apache-2.0
 # Fails if LIBRARY exports a name that does not match the regular expression MEANT, or none, or if
-# a text of the list NEEDED stands in no readable name, or one of the list HIDDEN does:
+# a text of the list NEEDED stands in no readable name, or one of the list HIDDEN does, or if a name
+# of the list C_NAMES, which are meant besides, is not exported:
 #   cmake -DNM=nm -DLIBRARY=<file> -DMEANT=<regex> [-DNEEDED=...] [-DNEEDED_BY=<script>] [-DHIDDEN=...]
-#         -P check_exports.cmake
+#         [-DC_NAMES=...] -P check_exports.cmake
 # The script sets more needed texts, as the list needed_entries.
 # Names are compared as they stand in the symbol table: the readable name of a template function
 # begins with its return type and would hide whose function it is.
@@ -13,9 +14,13 @@ execute_process(COMMAND "${NM}" -D --defined-only --format=posix "${LIBRARY}"
 string(REGEX MATCHALL "[^\n]+" lines "${table}")
 set(count 0)
 set(stray "")
+set(missing "${C_NAMES}")
 foreach(line IN LISTS lines)
   string(REGEX REPLACE "[ @].*" "" name "${line}")
-  if(name MATCHES "${MEANT}")
+  if(name IN_LIST C_NAMES)
+    list(REMOVE_ITEM missing "${name}")
+    math(EXPR count "${count} + 1")
+  elseif(name MATCHES "${MEANT}")
     math(EXPR count "${count} + 1")
   else()
     list(APPEND stray "${name}")
@@ -25,6 +30,9 @@ endforeach()
 if(stray)
   list(JOIN stray "\n  " text)
   message(FATAL_ERROR "${LIBRARY} exports names that are not its interface:\n  ${text}")
+elseif(missing)
+  list(JOIN missing "\n  " text)
+  message(FATAL_ERROR "${LIBRARY} does not export\n  ${text}")
 elseif(count EQUAL 0)
   message(FATAL_ERROR "${LIBRARY} exports nothing")
 endif()

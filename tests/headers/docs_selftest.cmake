@@ -30,7 +30,7 @@ function(expect_found file text needle)
 endfunction()
 
 file(REMOVE_RECURSE "${FIXTURE}")
-foreach(part docs rng/include statistics/include core/include)
+foreach(part docs rng/include service/include statistics/include core/include)
   file(COPY "${ROOT}/${part}/" DESTINATION "${FIXTURE}/${part}")
 endforeach()
 check(status said)

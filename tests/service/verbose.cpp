@@ -8,6 +8,7 @@
 #include <regex>
 #include <string>
 #include <tarn_serv.h>
+#include <thread>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -91,6 +92,57 @@ TEST_F(service_report, events_are_registered_at_level_2_only) {
   gpu::verbose_register_event(some_work());
   print(0.5);
   EXPECT_EQ(lines(), lines_of{"TARN_VERBOSE a call host:500.00ms device:N/A"});
+}
+
+TEST_F(service_report, depth_belongs_to_the_thread) {
+  set_level(1);
+  gpu::verbose_depth_inc();
+  std::thread([this] { print(1.5); }).join();
+  EXPECT_EQ(lines(), lines_of{"TARN_VERBOSE a call host:1.50s device:N/A"});
+  gpu::verbose_depth_dec();
+}
+
+TEST_F(service_report, events_belong_to_the_thread_and_go_with_it) {
+  set_level(2);
+  std::thread([this] { gpu::verbose_register_event(some_work()); }).join();
+  print(0.5);
+  std::thread([this] { print(0.5); }).join();
+  const std::string without = "TARN_VERBOSE a call host:500.00ms device:N/A";
+  EXPECT_EQ(lines(), (lines_of{without, without}));
+}
+
+TEST_F(service_report, the_device_time_spans_all_events) {
+  using sycl::info::event_profiling::command_end;
+  using sycl::info::event_profiling::command_start;
+  set_level(2);
+  sycl::event first = some_work();
+  sycl::event last = some_work();
+  gpu::verbose_register_event(last);
+  gpu::verbose_register_event(first);
+  print(0.5);
+  const auto span =
+      last.get_profiling_info<command_end>() - first.get_profiling_info<command_start>();
+  char text[32];
+  tarn_serv_format_seconds(text, sizeof text, static_cast<double>(span) * 1e-9);
+  EXPECT_EQ(lines(), lines_of{std::string("TARN_VERBOSE a call host:500.00ms device:") + text});
+}
+
+TEST_F(service_report, an_event_without_times_raises_and_is_forgotten) {
+  set_level(2);
+  sycl::queue without_times;
+  sycl::event event = without_times.fill(values.data(), 1.0f, values.size());
+  event.wait();
+  gpu::verbose_register_event(event);
+  EXPECT_THROW(print(0.5), sycl::exception);
+  EXPECT_EQ(lines(), lines_of{});
+  print(0.5);
+  EXPECT_EQ(lines(), lines_of{"TARN_VERBOSE a call host:500.00ms device:N/A"});
+}
+
+TEST_F(service_report, a_mode_below_0_is_off) {
+  set_level(-1);
+  print(0.5);
+  EXPECT_FALSE(std::ifstream(report_file()).good());
 }
 
 TEST_F(service_report, buffer_steps_nest_and_measure_at_every_level) {

@@ -1,0 +1,42 @@
+# SPDX-License-Identifier: Apache-2.0
+# The exported functions of the device services: the C names, all that there are, and those of
+# namespace kestrel::tarn::gpu.
+set(device_c_names
+  # which device a queue has
+  tarn_serv_gpu_get_device_id tarn_serv_gpu_get_device_info tarn_serv_gpu_get_device_info_with_arch
+  tarn_serv_gpu_get_architecture tarn_serv_gpu_get_architecture_and_stepping
+  tarn_serv_gpu_get_device_flags tarn_serv_gpu_get_tile_count tarn_serv_gpu_get_eu_count
+  tarn_gpu_get_max_workgroup_size tarn_gpu_get_cl_device_context
+  # kernels
+  tarn_serv_gpu_get_OCL_kernel tarn_serv_gpu_get_OCL_kernel_by_progname tarn_gpu_get_spirv_kernel
+  tarn_serv_gpu_get_binary_kernel tarn_gpu_get_binary_kernel_ext tarn_gpu_get_cached_kernel
+  tarn_serv_gpu_release_kernel tarn_serv_gpu_release_kernel_obj tarn_serv_gpu_have_binary_kernels
+  TARN_CL_Create_Handle TARN_CL_Destroy_Handle
+  # arguments, launches, memory, events
+  tarn_serv_gpu_set_buffer_arg tarn_gpu_set_usm_arg tarn_serv_gpu_set_SLM_arg
+  tarn_serv_gpu_set_scalar_arg_internal
+  tarn_serv_gpu_launch_kernel_1D tarn_serv_gpu_launch_kernel_2D tarn_serv_gpu_launch_kernel_3D
+  tarn_serv_gpu_alloc_temp_buffer tarn_serv_gpu_calloc_temp_buffer tarn_serv_gpu_free_buffer
+  tarn_serv_gpu_coalesce_events tarn_serv_gpu_release_event tarn_serv_gpu_host_wait
+  # the end
+  tarn_sycl_destructor tarn_sycl_destructor_local
+  # Level Zero as it was bound
+  tarn_zeDeviceGetProperties tarn_zeDeviceGetSubDevices tarn_zeModuleCreate tarn_zeKernelCreate
+  tarn_zeModuleDestroy tarn_zeModuleGetNativeBinary)
+
+set(device_functions
+  get_device_id get_device_info get_device_info_with_arch get_architecture
+  get_architecture_and_stepping get_device_flags get_tile_count get_eu_count
+  tarn_gpu_get_max_workgroup_size tarn_gpu_get_cl_device_context
+  get_OCL_kernel get_OCL_kernel_by_progname tarn_gpu_get_spirv_kernel get_binary_kernel
+  tarn_gpu_get_binary_kernel_ext tarn_gpu_get_cached_kernel release_kernel release_kernel_obj
+  have_binary_kernels
+  set_buffer_arg set_buffer_arg_usm tarn_gpu_set_usm_arg set_SLM_arg set_scalar_arg_internal
+  launch_kernel_1D launch_kernel_2D launch_kernel_3D
+  launch_kernel_1D_usm launch_kernel_2D_usm launch_kernel_3D_usm
+  alloc_temp_buffer calloc_temp_buffer free_buffer
+  alloc_temp_buffer_usm calloc_temp_buffer_usm free_buffer_usm
+  coalesce_events release_event host_wait coalesce_events_usm release_event_usm host_wait_usm
+  verbose_depth_inc verbose_depth_dec verbose_register_event set_verbose_gpu_iface
+  print_verbose_gpu_info)
+list(TRANSFORM device_functions REPLACE "(.+)" "kestrel::tarn::gpu::\\1(")
