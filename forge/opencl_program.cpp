@@ -55,6 +55,8 @@ std::vector<T> per_device(const opencl_calls& opencl, cl_program program, cl_pro
 constexpr cl_uint most_devices = 4096;
 constexpr std::size_t largest_binary = std::size_t{1} << 30;
 
+}  // namespace
+
 byte_vector program_binary(const opencl_calls& opencl, cl_program program, cl_device_id device) {
   cl_uint count = 0;
   check(opencl.clGetProgramInfo(program, CL_PROGRAM_NUM_DEVICES, sizeof count, &count, nullptr));
@@ -79,8 +81,6 @@ byte_vector program_binary(const opencl_calls& opencl, cl_program program, cl_de
                                 places.data(), nullptr));
   return binary;
 }
-
-}  // namespace
 
 byte_vector compile_program(const opencl_calls& opencl, cl_context context, cl_device_id device,
                             const char* source, const char* options) {

@@ -14,4 +14,8 @@ namespace kestrel::tarn::forge {
 byte_vector compile_program(const opencl_calls& opencl, cl_context context, cl_device_id device,
                             const char* source, const char* options);
 
+/// Returns the binary for `device` of a program that has been built.
+/// \throws opencl_error as compile_program does
+byte_vector program_binary(const opencl_calls& opencl, cl_program program, cl_device_id device);
+
 }  // namespace kestrel::tarn::forge
