@@ -83,6 +83,10 @@ opencl_counterpart find_counterpart(ze_device_handle_t device) {
       properties.type != ZE_DEVICE_TYPE_GPU) {
     return {};
   }
+  // A machine may have Level Zero alone: a call of OpenCL would end the process.
+  if (bind_opencl() != 0) {
+    return {};
+  }
   cl_platform_id platforms[most_platforms];
   cl_uint count = 0;
   if (cl::clGetPlatformIDs(most_platforms, platforms, &count) != CL_SUCCESS) {

@@ -72,8 +72,10 @@ void append_line(report_text& text, std::size_t number, sycl::queue& queue) {
   constexpr char line[] =
       "TARN_VERBOSE Detected GPU%zu %s Backend:%s VE:%d Stack:%d maxWGsize:%d\n";
   if (!can_be_asked(queue)) {
+    const bool is_opencl = service::code_of(queue.get_backend()) == service::backend_code::opencl;
     text.append(line, number, display_name(TARN_GPU_ARCH_UNKNOWN),
-                display_name(TARN_GPU_BACKEND_UNKNOWN), 0, 1, 0);
+                display_name(is_opencl ? TARN_GPU_BACKEND_OPENCL : TARN_GPU_BACKEND_LEVEL_ZERO), 0,
+                1, 0);
     return;
   }
   int status = 0;

@@ -46,7 +46,8 @@ class handle_cache {
 
  private:
   rw_word word_;
-  std::unordered_map<void*, Object, handle_hash> objects_{8};  // buckets, of one object on average
+  std::unordered_map<void*, Object, handle_hash> objects_{
+      8};  // buckets at least, of one object on average
 };
 
 }  // namespace kestrel::tarn::gpu

@@ -2,7 +2,11 @@
 // The device services that the self-test runs on, in both layers.
 #include "have_binary_kernels.hpp"
 
+#include <atomic>
 #include <cstring>
+#include <exception>
+#include <memory>
+#include <optional>
 
 #include <kestrel/tarn/gpu/kernel.hpp>
 #include <kestrel/tarn/gpu/launch.hpp>
@@ -110,8 +114,12 @@ class c_services final : public services_on<_cl_command_queue> {
   }
 };
 
+/// What fails late belongs to the test: its work goes to a queue of its own, whose errors are
+/// thrown while somebody waits for them. Those of the caller's queue are the caller's.
 class sycl_services final : public services_on<sycl::queue> {
  public:
+  ~sycl_services() override { *listening_ = false; }
+
   forge::self_test_record get_record(int*, void* queue) override {
     return part_of(record_with_arch(*queue_of(queue)));
   }
@@ -128,7 +136,7 @@ class sycl_services final : public services_on<sycl::queue> {
   }
 
   void* calloc_temp_buffer(int* status, void* queue, std::size_t bytes) override {
-    return gpu::calloc_temp_buffer(status, queue_of(queue), bytes);
+    return gpu::calloc_temp_buffer(status, own_queue(queue), bytes);
   }
 
   void write_buffer(int*, void*, void* buffer, std::uint32_t value) override {
@@ -152,13 +160,14 @@ class sycl_services final : public services_on<sycl::queue> {
         set_scalar_arg_internal(&records[i], &argument.value, argument.size);
       }
     }
-    return gpu::launch_kernel_3D(status, queue_of(queue),
+    return gpu::launch_kernel_3D(status, own_queue(queue),
                                  static_cast<tarn_gpu_kernel_struct_t*>(handle)->kernel, records,
                                  global, local, nullptr);
   }
 
   void host_wait(int* status, void* event) override {
     gpu::host_wait(status, static_cast<sycl::event*>(event));
+    own_->wait_and_throw();
   }
   void release_event(int* status, void* event) override {
     gpu::release_event(status, static_cast<sycl::event*>(event));
@@ -174,6 +183,22 @@ class sycl_services final : public services_on<sycl::queue> {
   static sycl::buffer<char, 1>* buffer_of(void* buffer) {
     return static_cast<sycl::buffer<char, 1>*>(buffer);
   }
+
+  sycl::queue* own_queue(void* queue) {
+    if (!own_) {
+      const sycl::queue& given = *queue_of(queue);
+      own_.emplace(given.get_context(), given.get_device(),
+                   [listening = listening_](const sycl::exception_list& errors) {
+                     if (*listening && errors.size() != 0) {
+                       std::rethrow_exception(*errors.begin());
+                     }
+                   });
+    }
+    return &*own_;
+  }
+
+  std::shared_ptr<std::atomic<bool>> listening_ = std::make_shared<std::atomic<bool>>(true);
+  std::optional<sycl::queue> own_;
 };
 
 }  // namespace

@@ -85,11 +85,13 @@ opencl_program build_here(const layer_place& place, const program_code& code) {
                        static_cast<cl_context>(place.context.native), code);
 }
 
-/// Level Zero compiles no source, so the OpenCL device of the same hardware does.
+/// Level Zero compiles no source, so the OpenCL device of the same hardware does. What is compiled
+/// only for other code to take its place is not kept: the key is that of the program that comes
+/// out.
 forge::byte_vector compile_elsewhere(const kernel_request& request, const program_code& source,
                                      const opencl_objects& where) {
   const auto build = [&] { return build_program(where.device, where.context, source); };
-  if (is_self_test(request)) {
+  if (request.code.format != program_format::source || is_self_test(request)) {
     return binary_of(build(), where.device);
   }
   kernel_request alone = request;

@@ -36,6 +36,8 @@ class busy_queues {
   int count_ = 0;
 };
 
+thread_local bool is_completer = false;
+
 }  // namespace
 
 completer& completer::instance() {
@@ -49,9 +51,12 @@ void completer::add(task& issued) {
     try {
       if (process_ != getpid()) {
         // What a parent's thread had is nobody's here.
-        first_ = last_ = held_ = nullptr;
+        while (first_ != nullptr) {
+          unlink(*first_);
+        }
+        held_ = nullptr;
         giving_back_ = nullptr;
-        count_ = 0;
+        busy_ = false;
         std::thread worker([this] { work(); });
         process_ = getpid();
         thread_ = worker.get_id();
@@ -76,12 +81,22 @@ void completer::add(task& issued) {
 void completer::remove(task& done) {
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    if (!done.watched) {
+    if (!done.watched || process_ != getpid()) {
       return;
     }
     unlink(done);
   }
   done.release();
+}
+
+void completer::before_telling() {
+  if (!is_completer) {
+    return;
+  }
+  std::unique_lock<std::mutex> lock(mutex_);
+  if (held_ != nullptr && held_->done()) {
+    let_go(lock);
+  }
 }
 
 void completer::settle(const queue_core& queue) {
@@ -150,22 +165,29 @@ bool completer::sweep() {
       break;
     }
     held_ = each;
+    busy_ = true;
     lock.unlock();
     const queue_core* const owner = each->queue().get();
-    const bool open = !each->done() && (busy.has(owner) || !each->reached());
+    const bool open =
+        !each->done() && (busy.has(owner) || !each->reached() || each->issued_before());
     if (open) {
       busy.add(owner);
-    } else {
-      each->wait();
+    } else if (!each->done()) {
+      each->finish_issued();  // the task may be gone when it returns
     }
     any = any || !open;
     lock.lock();
-    let_go(lock);
+    if (held_ != nullptr) {
+      let_go(lock);
+    }
+    busy_ = false;
+    put_down_.notify_all();
   }
   return any;
 }
 
 void completer::work() {
+  is_completer = true;
   std::chrono::microseconds nap = shortest_nap;
   for (;;) {
     {
@@ -186,7 +208,7 @@ void completer::end_all() {
       each->wait();
       each->release();
       lock.lock();
-    } else if ((held_ != nullptr || giving_back_ != nullptr) && !self) {
+    } else if (busy_ && !self) {
       put_down_.wait(lock);
     } else {
       return;

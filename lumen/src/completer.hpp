@@ -25,6 +25,9 @@ class completer {
   // Lets go of a task that another thread has ended. Those that the thread has in its hands it lets
   // go soon.
   void remove(task& done);
+  // To be called before a thread goes on to what comes after a task: if it is this one's, it lets
+  // the task go.
+  void before_telling();
   // Returns when the thread holds none of the queue's tasks that are done. It runs the user's code
   // before that, and nobody waits for it here.
   void settle(const queue_core& queue);
@@ -47,7 +50,8 @@ class completer {
   task* first_ = nullptr;
   task* last_ = nullptr;
   std::size_t count_ = 0;
-  task* held_ = nullptr;                     // the one that the thread looks after, or null
+  bool busy_ = false;     // the thread is at one of them, or at what comes after it
+  task* held_ = nullptr;  // the one that the thread looks after, or null
   const queue_core* giving_back_ = nullptr;  // the queue of one that it lets go, or null
   pid_t process_ = 0;  // where the thread is: a child made by fork has none of its own yet
   std::thread::id thread_;

@@ -4,6 +4,7 @@
 
 #include <cstdio>
 #include <thread>
+#include <unistd.h>
 
 #include "clock.hpp"
 #include "completer.hpp"
@@ -137,7 +138,8 @@ void queue_core::settle() const {
     return;
   }
   completer::instance().settle(*this);
-  while (partings->load(std::memory_order_acquire) != 0) {
+  // In a child made by fork the threads are gone.
+  while (partings->load(std::memory_order_acquire) != 0 && process == getpid()) {
     std::this_thread::yield();
   }
 }

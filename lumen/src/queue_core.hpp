@@ -7,6 +7,7 @@
 #include <exception>
 #include <memory>
 #include <mutex>
+#include <unistd.h>
 #include <vector>
 
 #include "backend.hpp"
@@ -49,8 +50,10 @@ class queue_core : public std::enable_shared_from_this<queue_core> {
   const std::unique_ptr<command_stream> stream;
   // Threads that let go of tasks of a detached device.
   const std::shared_ptr<std::atomic<int>> partings = std::make_shared<std::atomic<int>>(0);
+  const pid_t process = getpid();
   // Returns when no thread of the runtime is about to let go of the queue: who has waited for all
-  // of its work may then take away what stands behind it.
+  // of its work, and for what comes after that work elsewhere, may then take away what stands
+  // behind it.
   void settle() const;
   // Held while a task of a detached device goes into the stream, which is one step for the others.
   std::mutex issue_mutex;

@@ -278,6 +278,9 @@ void task::wait_for_dependencies() noexcept {
       try {
         dependency->end_mark_->wait();
       } catch (...) {  // told by the dependency itself
+        while (!dependency->end_mark_->reached()) {
+          std::this_thread::yield();
+        }
       }
     }
   }
@@ -325,12 +328,16 @@ void task::issue() {
   end_mark_ = stream.mark();
 }
 
-void released_tasks::tell() const {
-  for (const task_ref& successor : successors) {
-    successor->dependency_done();
-  }
-  for (const task_ref& follower : followers) {
-    follower->dependency_done();
+// No reference is kept to a task that may begin: it holds itself until it is done, and whoever
+// waits for it then may take away what stands behind it.
+void released_tasks::tell() {
+  completer::instance().before_telling();
+  for (std::vector<task_ref>* const list : {&successors, &followers}) {
+    for (task_ref& each : *list) {
+      task& released = *each.get();
+      each = task_ref();
+      released.dependency_done();
+    }
   }
   if (after_the_end) {
     executor::instance().finished();

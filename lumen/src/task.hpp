@@ -44,7 +44,7 @@ struct released_tasks {
   std::vector<task_ref> followers;
   bool after_the_end = false;  // of the task; else it is issued
 
-  void tell() const;
+  void tell();
 };
 
 enum class task_state : std::uint32_t { pending, ready, running, issued, done };

@@ -84,9 +84,8 @@ const instruction* first_call_at(const instructions& body, const std::string& ta
   return nullptr;
 }
 
-/// The backend frame, or the entry's closure over it where the compiler left that one whole.
 bool calls_frame(const instruction& i) {
-  return holds(i.operands, "generate_on_device") || holds(i.operands, "ENKUlvE_clEv");
+  return holds(i.operands, "generate_on_device");
 }
 
 /// What is wrong with an entry; empty if nothing is.

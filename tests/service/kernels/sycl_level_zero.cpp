@@ -151,6 +151,7 @@ TEST_F(LevelZeroKernels, ADummyIsCompiledByTheOpenCLDevice) {
   EXPECT_NE(std::search(module.begin(), module.end(), code.begin(), code.end()), module.end());
   release(kernel);
   EXPECT_EQ(get_binary_kernel(&status, &*queue, 3, &with_dummy, "k"), kernel);
+  EXPECT_EQ(opencl_layer::objects(opencl_layer::object::program), 0);  // the dummy is not kept
 }
 
 TEST_F(LevelZeroKernels, AProgramWithANameGivesPlainKernels) {
