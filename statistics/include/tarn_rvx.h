@@ -205,8 +205,8 @@ RVX_API int rvxsRngUniform(int64_t method, rvx_stream stream, int64_t n, float* 
 RVX_API int rvxdRngUniform(int64_t method, rvx_stream stream, int64_t n, double* r, double a,
                            double b);
 
-/** Integers of [a, b), a < b (-5): floor of a float uniform, so a range wider than 2^24 has gaps,
- * and rounding may deliver b itself. */
+/** Integers of [a, b), a < b (-5): floor of a float uniform. Bounds beyond 2^24 are rounded, which
+ * leaves gaps and may leave [a, b); rounding may deliver b itself in any case. */
 RVX_API int rvxiRngUniform(int64_t method, rvx_stream stream, int64_t n, int32_t* r, int32_t a,
                            int32_t b);
 

@@ -25,9 +25,14 @@ struct native_property {
 
 using omp_value = std::variant<std::intptr_t, void*, std::string>;
 
+struct omp_property {
+  int status;  // where its type is asked for
+  omp_value value;
+};
+
 struct interop_object {
   std::map<int, native_property> native;
-  std::map<int, omp_value> omp;
+  std::map<int, omp_property> omp;
 };
 
 enum function { tgt_property, omp_int, omp_ptr, omp_str, functions };
@@ -75,8 +80,8 @@ const T* find(function called, const void* handle, int property, int* status) {
     code = no_value;
     return nullptr;
   }
-  const T* const value = std::get_if<T>(&found->second);
-  code = value != nullptr ? success : type_codes[found->second.index()];
+  const T* const value = std::get_if<T>(&found->second.value);
+  code = value != nullptr ? found->second.status : type_codes[found->second.value.index()];
   return value;
 }
 
@@ -87,7 +92,12 @@ interop_object* object_of(void* handle) {
 template <typename T>
 void set_omp(void* handle, int property, T value) {
   const std::lock_guard<std::mutex> guard(runtime().mutex);
-  object_of(handle)->omp[property] = omp_value(value);
+  object_of(handle)->omp[property] = {success, omp_value(value)};
+}
+
+void fail_int(void* handle, int property, int status, std::intptr_t value) {
+  const std::lock_guard<std::mutex> guard(runtime().mutex);
+  object_of(handle)->omp[property] = {status, omp_value(value)};
 }
 
 void* make() {
@@ -132,7 +142,8 @@ int mistakes() {
 
 TARN_SHOWN const omptarget::controls omptarget_controls;
 const omptarget::controls omptarget_controls = {
-    make, end, set_native, set_omp<std::intptr_t>, set_omp<void*>, set_str, calls, mistakes};
+    make,     end,   set_native, set_omp<std::intptr_t>, set_omp<void*>, set_str,
+    fail_int, calls, mistakes};
 
 TARN_SHOWN int __tgt_get_interop_property(void* interop, int property, void** value) {
   const std::lock_guard<std::mutex> guard(runtime().mutex);
@@ -144,7 +155,7 @@ TARN_SHOWN int __tgt_get_interop_property(void* interop, int property, void** va
   if (found == object->native.end()) {
     return -1;
   }
-  if (found->second.status == success) {
+  if (found->second.status == success || found->second.value != nullptr) {
     *value = found->second.value;
   }
   return found->second.status;

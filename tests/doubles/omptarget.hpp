@@ -20,6 +20,7 @@ struct controls {
   void (*set_int)(void* interop, int property, std::intptr_t value);
   void (*set_ptr)(void* interop, int property, void* value);
   void (*set_str)(void* interop, int property, const char* value);
+  void (*fail_int)(void* interop, int property, int status, std::intptr_t value);
   bool (*calls)(const char* function, int* number);
   int (*mistakes)();
 };
@@ -67,6 +68,10 @@ class interop {
   void fail_native(int property, int status) {
     get().set_native(handle_, property, status, nullptr);
   }
+  /// It stores `value`, and its result is `status` nevertheless.
+  void fail_native_with(int property, int status, void* value) {
+    get().set_native(handle_, property, status, value);
+  }
   /// Property 2, a pointer to a byte.
   void set_nowait(bool nowait) {
     *nowait_ = nowait ? 1 : 0;
@@ -82,6 +87,10 @@ class interop {
   void set_int(int property, std::intptr_t value) { get().set_int(handle_, property, value); }
   void set_ptr(int property, void* value) { get().set_ptr(handle_, property, value); }
   void set_str(int property, const char* value) { get().set_str(handle_, property, value); }
+  /// omp_get_interop_int gives `value`, and tells `status`, which is not 0.
+  void fail_int_with(int property, int status, std::intptr_t value) {
+    get().fail_int(handle_, property, status, value);
+  }
 
  private:
   void* handle_;

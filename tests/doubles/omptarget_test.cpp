@@ -39,6 +39,9 @@ TEST(OmptargetDouble, NativePropertiesAreWhatATestSets) {
   value = &object;
   EXPECT_EQ(native(object.handle(), 9, &value), 5);
   EXPECT_EQ(value, &object) << "stored though the call failed";
+  object.fail_native_with(9, 5, &device);
+  EXPECT_EQ(native(object.handle(), 9, &value), 5);
+  EXPECT_EQ(value, &device) << "such a runtime stores";
 }
 
 TEST(OmptargetDouble, TheFlagNowaitIsAByteThatPropertyTwoPointsTo) {
@@ -83,6 +86,9 @@ TEST(OmptargetDouble, EachPropertyOfOpenmpHasOneType) {
   EXPECT_EQ(get_int(object.handle(), 10, &status), 0);
   EXPECT_EQ(status, 1) << "not set";
   EXPECT_EQ(get_int(object.handle(), -1, nullptr), 3);
+  object.fail_int_with(-1, 1, 6);
+  EXPECT_EQ(get_int(object.handle(), -1, &status), 6);
+  EXPECT_EQ(status, 1) << "and a value";
 }
 
 TEST(OmptargetDouble, CallsAreCountedAndAnObjectThatIsGoneIsAMistake) {
