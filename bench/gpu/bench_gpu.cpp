@@ -21,7 +21,7 @@
 
 #include <benchmark/benchmark.h>
 
-#include "../statistics/ratios.hpp"
+#include "../comparisons.hpp"
 #include "cuda_fillers.hpp"
 #include "figures.hpp"
 #include "roads.hpp"

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a word costs through bit_generator: read alone, and under std::shuffle and a standard
-// distribution, beside std::mt19937. Names read generator/use.
+// distribution, beside std::mt19937.
 #include <algorithm>
 #include <cstdint>
 #include <numeric>
@@ -12,6 +12,8 @@
 #include <sycl/sycl.hpp>
 
 #include <benchmark/benchmark.h>
+
+#include "../comparisons.hpp"
 
 namespace {
 
@@ -79,21 +81,37 @@ void one_word(benchmark::State& state) {
   }
 }
 
+void add(const std::string& name, void (*run)(benchmark::State&)) {
+  benchmark::RegisterBenchmark(name.c_str(), run)
+      ->Repetitions(5)
+      ->MinTime(0.1)
+      ->ReportAggregatesOnly();
+}
+
 template <typename Source>
-void register_source(const std::string& name) {
-  benchmark::RegisterBenchmark((name + "/read").c_str(), read<Source>);
-  benchmark::RegisterBenchmark((name + "/shuffle").c_str(), shuffle<Source>);
-  benchmark::RegisterBenchmark((name + "/normal").c_str(), normal<Source>);
+void add_source(const std::string& name) {
+  add(name + "/read", read<Source>);
+  add(name + "/shuffle", shuffle<Source>);
+  add(name + "/normal", normal<Source>);
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
-  register_source<viewed<rng::philox4x32x10>>("philox4x32x10");
-  register_source<viewed<rng::mt19937>>("mt19937");
-  register_source<plain<std::mt19937>>("std::mt19937");
-  benchmark::RegisterBenchmark("philox4x32x10/one_word", one_word<rng::philox4x32x10>);
-  benchmark::RegisterBenchmark("mt19937/one_word", one_word<rng::mt19937>);
-  benchmark::Initialize(&argc, argv);
+  add_source<viewed<rng::philox4x32x10>>("philox4x32x10");
+  add_source<viewed<rng::mt19937>>("mt19937");
+  add_source<plain<std::mt19937>>("std_mt19937");
+  add("philox4x32x10/one_word", one_word<rng::philox4x32x10>);
+  add("mt19937/one_word", one_word<rng::mt19937>);
+  if (!initialize(argc, argv)) {
+    return 1;
+  }
+  std::vector<quotient> quotients;
+  for (const std::string engine : {"philox4x32x10/", "mt19937/"}) {
+    for (const std::string use : {"read", "shuffle", "normal"}) {
+      quotients.push_back({engine + use, {"std_mt19937/" + use}});
+    }
+  }
+  announce_quotients("views", quotients);
   benchmark::RunSpecifiedBenchmarks();
 }

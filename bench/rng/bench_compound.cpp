@@ -3,7 +3,6 @@
 // standard library on one thread: what a user without a GPU would pick instead. The passes, their
 // scans and their waits have to leave it ahead.
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
 #include <random>
 #include <string>
@@ -14,7 +13,7 @@
 
 #include <benchmark/benchmark.h>
 
-#include "../statistics/ratios.hpp"
+#include "../comparisons.hpp"
 
 namespace {
 
@@ -47,12 +46,12 @@ void standard(benchmark::State& state, Distr distr) {
   state.SetItemsProcessed(state.iterations() * count);
 }
 
-std::vector<std::string> names;
+std::vector<quotient> quotients;
 
 /// A family with parameters on its rejecting road, and its counterpart.
 template <typename Distr, typename Standard>
 void add(const std::string& name, const Distr& distr, const Standard& other) {
-  names.push_back(name);
+  quotients.push_back({name + "/virtual_gpu", {name + "/std"}, 1.0});
   const auto in_real_time = [](benchmark::internal::Benchmark* made) {
     made->UseRealTime()->Repetitions(5);
   };
@@ -79,9 +78,6 @@ int main(int argc, char** argv) {
   if (!initialize(argc, argv)) {
     return 1;
   }
-  ratio_reporter reporter;
-  benchmark::RunSpecifiedBenchmarks(&reporter);
-  for (const std::string& name : names) {
-    reporter.print_ratio(name + "/virtual_gpu", name + "/std", 1.0);
-  }
+  announce_quotients("rejection", quotients);
+  benchmark::RunSpecifiedBenchmarks();
 }

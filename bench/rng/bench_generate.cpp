@@ -32,8 +32,10 @@ void draw(benchmark::State& state, const sycl::device& device) {
     benchmark::ClobberMemory();
   }
   sycl::free(values, queue);
-  state.SetItemsProcessed(state.iterations() * n);
-  state.SetBytesProcessed(state.iterations() * n * static_cast<std::int64_t>(sizeof(T)));
+  if (n > 1) {
+    state.SetItemsProcessed(state.iterations() * n);
+    state.SetBytesProcessed(state.iterations() * n * static_cast<std::int64_t>(sizeof(T)));
+  }
 }
 
 /// The ceiling: how fast this memory takes anything at all.

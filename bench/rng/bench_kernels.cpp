@@ -4,7 +4,6 @@
 // loop's, times the number of threads; where the processors share their cores, the loop on as many
 // threads says what that number is worth.
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <string>
@@ -16,7 +15,7 @@
 
 #include <benchmark/benchmark.h>
 
-#include "../statistics/ratios.hpp"
+#include "../comparisons.hpp"
 #include "engines/mcg31m1.hpp"
 #include "engines/mcg59.hpp"
 #include "engines/philox4x32x10.hpp"
@@ -69,6 +68,8 @@ void virtual_gpu(benchmark::State& state) {
 
 const int threads = static_cast<int>(std::thread::hardware_concurrency());
 
+std::vector<quotient> quotients;
+
 template <typename Engine>
 void register_engine(const std::string& name) {
   const auto add = [](const std::string& what, void (*run)(benchmark::State&)) {
@@ -77,25 +78,20 @@ void register_engine(const std::string& name) {
   add(name + "/loop", plain_loop<Engine>);
   add(name + "/loops", plain_loop<Engine>)->Threads(threads);
   add(name + "/virtual_gpu", virtual_gpu<Engine>);
+  quotients.push_back({name + "/virtual_gpu", {name + "/loop"}, least_share * threads});
+  quotients.push_back({name + "/virtual_gpu", {name + "/loops"}, least_share});
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
   setenv("LUMEN_VIRTUAL_DEVICES", "gpu", 0);
-  const std::vector<std::string> engines = {"philox4x32x10", "mcg31m1", "mcg59"};
-  register_engine<rng::philox4x32x10>(engines[0]);
-  register_engine<rng::mcg31m1>(engines[1]);
-  register_engine<rng::mcg59>(engines[2]);
+  register_engine<rng::philox4x32x10>("philox4x32x10");
+  register_engine<rng::mcg31m1>("mcg31m1");
+  register_engine<rng::mcg59>("mcg59");
   if (!initialize(argc, argv)) {
     return 1;
   }
-  ratio_reporter reporter;
-  benchmark::RunSpecifiedBenchmarks(&reporter);
-  std::printf("\nuniform<float>, %lld values, %d threads\n", static_cast<long long>(count),
-              threads);
-  for (const std::string& engine : engines) {
-    reporter.print_ratio(engine + "/virtual_gpu", engine + "/loop", least_share * threads);
-    reporter.print_ratio(engine + "/virtual_gpu", engine + "/loops", least_share);
-  }
+  announce_quotients("kernels", quotients);
+  benchmark::RunSpecifiedBenchmarks();
 }

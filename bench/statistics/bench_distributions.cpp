@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Routines of the host statistics library on philox4x32x10 and one thread, 4 million values, beside
-// what a user would take instead, in one run; short calls; and what a second thread adds. Prints
-// the quotients of the medians at the end.
-#include <algorithm>
+// what a user would take instead, in one run; short calls; and what a second thread adds.
 #include <cstdio>
 #include <cstdlib>
 #include <functional>
@@ -11,8 +9,8 @@
 
 #include <benchmark/benchmark.h>
 
+#include "../comparisons.hpp"
 #include "distribution_peers.hpp"
-#include "ratios.hpp"
 #include "tarn_rvx.h"
 #include "tarn_serv.h"
 
@@ -120,43 +118,38 @@ const std::vector<routine<std::int32_t>> integer_routines = {
      false},
 };
 
-// What each routine is asked to reach: a quotient over the fastest of the peers.
-struct goal {
-  const char* routine;
-  double ratio;
-  std::vector<std::string> peers;
-};
-const std::vector<goal> goals = {
-    {"uniform_float", 2.5, {"random123/uniform_float"}},
-    {"uniform_double", 2, {"random123/uniform_double"}},
-    {"gaussian_float_icdf", 5, {"boost/normal_float"}},
-    {"gaussian_float_box_muller2", 5, {"boost/normal_float"}},
-    {"gaussian_double_icdf", 4, {"boost/normal_double"}},
-    {"gaussian_double_box_muller2", 4, {"boost/normal_double"}},
-    {"exponential", 4, {"boost/exponential_float"}},
-    {"rayleigh", 4, {"boost/exponential_float"}},
-    {"weibull", 4, {"boost/exponential_float"}},
-    {"gumbel", 4, {"boost/exponential_float"}},
-    {"laplace", 4, {"boost/exponential_float"}},
-    {"cauchy", 4, {"boost/exponential_float"}},
-    {"lognormal_double", 8, {"numpy/lognormal"}},
-    {"gamma", 4, {"std/gamma", "gsl/gamma", "numpy/gamma"}},
-    {"beta", 5, {"gsl/beta", "numpy/beta"}},
-    {"poisson_icdf_10",
-     15,
-     {"std/poisson_10", "boost/poisson_10", "gsl/poisson_10", "numpy/poisson_10"}},
-    {"poisson_icdf_500",
-     8,
-     {"std/poisson_500", "boost/poisson_500", "gsl/poisson_500", "numpy/poisson_500"}},
-    {"poisson_ptpe_10",
-     8,
-     {"std/poisson_10", "boost/poisson_10", "gsl/poisson_10", "numpy/poisson_10"}},
-    {"poisson_ptpe_500",
-     4,
-     {"std/poisson_500", "boost/poisson_500", "gsl/poisson_500", "numpy/poisson_500"}},
-    {"binomial", 6, {"boost/binomial", "numpy/binomial"}},
-    {"hypergeometric", 8, {"numpy/hypergeometric"}},
-    {"negative_binomial", 10, {"numpy/negative_binomial"}},
+// What each routine is asked to reach over the fastest of the peers.
+const std::vector<quotient> goals = {
+    {"uniform_float/tarn", {"uniform_float/random123"}, 2.5},
+    {"uniform_double/tarn", {"uniform_double/random123"}, 2},
+    {"gaussian_float_icdf/tarn", {"normal_float/boost"}, 5},
+    {"gaussian_float_box_muller2/tarn", {"normal_float/boost"}, 5},
+    {"gaussian_double_icdf/tarn", {"normal_double/boost"}, 4},
+    {"gaussian_double_box_muller2/tarn", {"normal_double/boost"}, 4},
+    {"exponential/tarn", {"exponential_float/boost"}, 4},
+    {"rayleigh/tarn", {"exponential_float/boost"}, 4},
+    {"weibull/tarn", {"exponential_float/boost"}, 4},
+    {"gumbel/tarn", {"exponential_float/boost"}, 4},
+    {"laplace/tarn", {"exponential_float/boost"}, 4},
+    {"cauchy/tarn", {"exponential_float/boost"}, 4},
+    {"lognormal_double/tarn", {"lognormal/numpy"}, 8},
+    {"gamma/tarn", {"gamma/std", "gamma/gsl", "gamma/numpy"}, 4},
+    {"beta/tarn", {"beta/gsl", "beta/numpy"}, 5},
+    {"poisson_icdf_10/tarn",
+     {"poisson_10/std", "poisson_10/boost", "poisson_10/gsl", "poisson_10/numpy"},
+     15},
+    {"poisson_icdf_500/tarn",
+     {"poisson_500/std", "poisson_500/boost", "poisson_500/gsl", "poisson_500/numpy"},
+     8},
+    {"poisson_ptpe_10/tarn",
+     {"poisson_10/std", "poisson_10/boost", "poisson_10/gsl", "poisson_10/numpy"},
+     8},
+    {"poisson_ptpe_500/tarn",
+     {"poisson_500/std", "poisson_500/boost", "poisson_500/gsl", "poisson_500/numpy"},
+     4},
+    {"binomial/tarn", {"binomial/boost", "binomial/numpy"}, 6},
+    {"hypergeometric/tarn", {"hypergeometric/numpy"}, 8},
+    {"negative_binomial/tarn", {"negative_binomial/numpy"}, 10},
 };
 constexpr double two_threads = 1.7;
 constexpr double short_call = 300;  // nanoseconds
@@ -198,7 +191,7 @@ void add_all(const std::vector<routine<Value>>& routines, const std::vector<Peer
   for (const routine<Value>& r : routines) {
     const auto draw = [r](std::int64_t n, Value* to) { check(r.draw(n, to)); };
     const std::string name = r.name;
-    add_draw<Value>(name, count, 1, draw);
+    add_draw<Value>(name + "/tarn", count, 1, draw);
     if (r.fixed_words) {
       add_draw<Value>(name + "/1thread", count, 1, draw, measure::clock);
       add_draw<Value>(name + "/2threads", count, 2, draw, measure::clock);
@@ -210,22 +203,29 @@ void add_all(const std::vector<routine<Value>>& routines, const std::vector<Peer
                     [p](std::int64_t n, Value* to) { p.fill(static_cast<std::size_t>(n), to); });
 }
 
-std::string fastest(const ratio_reporter& reporter, const std::vector<std::string>& names) {
-  return *std::max_element(names.begin(), names.end(), [&](const auto& a, const auto& b) {
-    return reporter.rate(a) < reporter.rate(b);
-  });
-}
-
 template <class Value>
-void print_threads_and_short_calls(const ratio_reporter& reporter,
-                                   const std::vector<routine<Value>>& routines) {
+void compare_threads_and_short_calls(const std::vector<routine<Value>>& routines,
+                                     std::vector<quotient>& threads,
+                                     std::vector<time_limit>& short_calls) {
   for (const routine<Value>& r : routines) {
     if (!r.fixed_words)
       continue;
     const std::string name = r.name;
-    reporter.print_ratio(name + "/2threads", name + "/1thread", two_threads);
-    reporter.print_time(name + "/short", short_call);
+    threads.push_back({name + "/2threads", {name + "/1thread"}, two_threads});
+    short_calls.push_back({name + "/short", short_call});
   }
+}
+
+void announce_tables() {
+  announce_quotients("peers", goals);
+  announce_rates(peers::numpy_rates());
+  std::vector<quotient> threads;
+  std::vector<time_limit> short_calls;
+  compare_threads_and_short_calls(float_routines, threads, short_calls);
+  compare_threads_and_short_calls(double_routines, threads, short_calls);
+  compare_threads_and_short_calls(integer_routines, threads, short_calls);
+  announce_quotients("threads", threads);
+  announce_times("short", short_calls);
 }
 
 }  // namespace
@@ -238,17 +238,8 @@ int main(int argc, char** argv) {
   add_all(double_routines, peers::double_peers);
   add_all(integer_routines, peers::integer_peers);
 
-  ratio_reporter reporter;
-  benchmark::RunSpecifiedBenchmarks(&reporter);
-  for (const peers::numpy_rate& rate : peers::numpy_rates())
-    reporter.set_rate(rate.name, rate.rate);
-  std::printf("\nQuotients of the median rates (values per second, one thread)\n");
-  for (const goal& wanted : goals)
-    reporter.print_ratio(wanted.routine, fastest(reporter, wanted.peers), wanted.ratio);
-  std::printf("\nA second thread, and calls of %d values\n", static_cast<int>(short_count));
-  print_threads_and_short_calls(reporter, float_routines);
-  print_threads_and_short_calls(reporter, double_routines);
-  print_threads_and_short_calls(reporter, integer_routines);
+  announce_tables();
+  benchmark::RunSpecifiedBenchmarks();
   check(rvxDeleteStream(&stream));
   return 0;
 }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Raw words of every engine of the host statistics library on one thread, beside what a user would
-// take instead, in one run; the cost of a long skip and of making a stream. Prints the quotients of
-// the medians at the end.
+// take instead, in one run; the cost of a long skip and of making a stream. By the processor time
+// of the thread, which other work on the machine disturbs least.
 #include <cstdio>
 #include <cstdlib>
 #include <functional>
@@ -10,8 +10,8 @@
 
 #include <benchmark/benchmark.h>
 
+#include "../comparisons.hpp"
 #include "engine_peers.hpp"
-#include "ratios.hpp"
 #include "tarn_rvx.h"
 #include "tarn_serv.h"
 
@@ -36,34 +36,26 @@ const engine_row engines[] = {
 };
 
 // What each engine is asked to reach, and beside whom.
-struct goal {
-  const char *engine, *peer;
-  double ratio;
+const std::vector<quotient> word_goals = {
+    {"philox4x32x10/words", {"random123_philox/words"}, 2.5},
+    {"ars5/words", {"random123_ars5/words"}, 1.5},
+    {"mt19937/words", {"std_mt19937/words"}, 5},
+    {"mt2203/words", {"std_mt19937/words"}, 5},
+    {"sfmt19937/words", {"std_mt19937/words"}, 6},
+    {"r250/words", {"gsl_r250/words"}, 6},
+    {"mcg31m1/words", {"std_mt19937/words"}, 6},
+    {"mcg59/words", {"std_mt19937/words"}, 6},
+    {"mrg32k3a/words", {"gsl_cmrg/words"}, 5},
+    {"wichmann_hill/words", {"gsl_cmrg/words"}, 3},
+    {"sobol/words", {"boost_sobol_40/words"}, 4},
+    {"niederreiter/words", {"gsl_niederreiter_12/words"}, 4},
 };
-constexpr goal word_goals[] = {
-    {"philox4x32x10", "random123_philox", 2.5},
-    {"ars5", "random123_ars5", 1.5},
-    {"mt19937", "std_mt19937", 5},
-    {"mt2203", "std_mt19937", 5},
-    {"sfmt19937", "std_mt19937", 6},
-    {"r250", "gsl_r250", 6},
-    {"mcg31m1", "std_mt19937", 6},
-    {"mcg59", "std_mt19937", 6},
-    {"mrg32k3a", "gsl_cmrg", 5},
-    {"wichmann_hill", "gsl_cmrg", 3},
-    {"sobol", "boost_sobol_40", 4},
-    {"niederreiter", "gsl_niederreiter_12", 4},
-};
-struct time_goal {
-  const char* name;
-  double nanoseconds;
-};
-constexpr time_goal time_goals[] = {
-    {"skip/philox4x32x10", 100}, {"skip/ars5", 100},           {"skip/mcg31m1", 2000},
-    {"skip/mcg59", 2000},        {"skip/wichmann_hill", 2000}, {"skip/mrg32k3a", 2000},
-    {"skip/mt19937", 5e6},       {"skip/sfmt19937", 5e6},      {"make/mt19937", 5000},
-    {"make/mt2203", 5000},       {"make/sfmt19937", 5000},     {"make/philox4x32x10", 200},
-    {"make/ars5", 200},
+const std::vector<time_limit> time_goals = {
+    {"philox4x32x10/skip", 100}, {"ars5/skip", 100},           {"mcg31m1/skip", 2000},
+    {"mcg59/skip", 2000},        {"wichmann_hill/skip", 2000}, {"mrg32k3a/skip", 2000},
+    {"mt19937/skip", 5e6},       {"sfmt19937/skip", 5e6},      {"mt19937/make", 5000},
+    {"mt2203/make", 5000},       {"sfmt19937/make", 5000},     {"philox4x32x10/make", 200},
+    {"ars5/make", 200},
 };
 
 void check(int status) {
@@ -83,7 +75,6 @@ rvx_stream new_stream(const engine_row& engine) {
 benchmark::internal::Benchmark* add(const std::string& name,
                                     const std::function<void(benchmark::State&)>& run) {
   return benchmark::RegisterBenchmark(name.c_str(), run)
-      ->UseRealTime()
       ->Repetitions(repetitions)
       ->ReportAggregatesOnly();
 }
@@ -107,12 +98,12 @@ void add_fill(const std::string& name, std::size_t parts, const std::function<vo
 
 void add_engine(const engine_row& engine) {
   rvx_stream stream = new_stream(engine);
-  add_fill<std::uint32_t>("words/" + engine.name, engine.parts, [stream](std::uint32_t* out) {
+  add_fill<std::uint32_t>(engine.name + "/words", engine.parts, [stream](std::uint32_t* out) {
     check(rvxiRngUniformBits(0, stream, count, out));
   });
   // Distances of 63 bits; a finite sequence is set back first.
   if (engine.skip && engine.name != "sobol" && engine.name != "niederreiter") {
-    add("skip/" + engine.name, [stream](benchmark::State& state) {
+    add(engine.name + "/skip", [stream](benchmark::State& state) {
       std::uint64_t distance = 0x7123456789ABCDEF;
       for (auto _ : state) {
         check(rvxSkipAheadStream(stream, static_cast<std::int64_t>(distance)));
@@ -121,7 +112,7 @@ void add_engine(const engine_row& engine) {
       }
     })->MinTime(0.05);
   }
-  add("make/" + engine.name, [engine](benchmark::State& state) {
+  add(engine.name + "/make", [engine](benchmark::State& state) {
     for (auto _ : state) {
       rvx_stream made = new_stream(engine);
       check(rvxDeleteStream(&made));
@@ -132,12 +123,12 @@ void add_engine(const engine_row& engine) {
 void add_peers() {
   using fill_words = void (*)(std::size_t, std::uint32_t*);
   const std::pair<const char*, fill_words> word_peers[] = {
-      {"random123_philox", peers::random123_philox},
-      {"random123_ars5", peers::random123_ars5},
-      {"std_mt19937", peers::std_mt19937},
-      {"gsl_r250", peers::gsl_r250},
-      {"gsl_cmrg", peers::gsl_cmrg},
-      {"boost_sobol_40", peers::boost_sobol_40},
+      {"random123_philox/words", peers::random123_philox},
+      {"random123_ars5/words", peers::random123_ars5},
+      {"std_mt19937/words", peers::std_mt19937},
+      {"gsl_r250/words", peers::gsl_r250},
+      {"gsl_cmrg/words", peers::gsl_cmrg},
+      {"boost_sobol_40/words", peers::boost_sobol_40},
   };
   for (const auto& [name, fill] : word_peers) {
     // A processor without AES cannot run that peer.
@@ -145,7 +136,7 @@ void add_peers() {
       continue;
     add_fill<std::uint32_t>(name, 1, [fill = fill](std::uint32_t* out) { fill(count, out); });
   }
-  add_fill<double>("gsl_niederreiter_12", 1,
+  add_fill<double>("gsl_niederreiter_12/words", 1,
                    [](double* out) { peers::gsl_niederreiter_12(count, out); });
 }
 
@@ -160,13 +151,8 @@ int main(int argc, char** argv) {
     add_engine(engine);
   add_peers();
 
-  ratio_reporter reporter;
-  benchmark::RunSpecifiedBenchmarks(&reporter);
-  std::printf("\nQuotients of the median rates (words per second, one thread)\n");
-  for (const goal& wanted : word_goals)
-    reporter.print_ratio(std::string("words/") + wanted.engine, wanted.peer, wanted.ratio);
-  std::printf("\nMedian times\n");
-  for (const time_goal& wanted : time_goals)
-    reporter.print_time(wanted.name, wanted.nanoseconds);
+  announce_quotients("words", word_goals);
+  announce_times("streams", time_goals);
+  benchmark::RunSpecifiedBenchmarks();
   return 0;
 }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Words and uniforms of philox4x32x10 from the host statistics library, beside its peers and the
-// rate of memset, in one run. Prints the quotients of the medians at the end.
+// rate of memset, in one run.
 #include <cstdio>
 #include <cstring>
 #include <functional>
@@ -9,8 +9,8 @@
 
 #include <benchmark/benchmark.h>
 
+#include "../comparisons.hpp"
 #include "peers.hpp"
-#include "ratios.hpp"
 #include "tarn_rvx.h"
 #include "tarn_serv.h"
 
@@ -20,28 +20,29 @@ constexpr std::size_t medium = 4'000'000;   // values: 16 MB of floats
 constexpr std::size_t large = 100'000'000;  // values: far above every cache
 constexpr int repetitions = 9;
 
-// One benchmark: fill(n, out) writes n values; the array is touched before.
+// One benchmark: fill(n, out) writes n values; the array is touched before. Large arrays, which
+// threads share, are measured by the clock; the others by the processor time of the thread, which
+// other work on the machine disturbs least.
 template <class Value>
 void add(const std::string& name, std::size_t n,
          const std::function<void(std::size_t, Value*)>& fill) {
-  benchmark::RegisterBenchmark(
-      name.c_str(),
-      [n, fill](benchmark::State& state) {
-        std::vector<Value> out(n);
-        fill(n, out.data());
-        for (auto _ : state) {
-          fill(n, out.data());
-          benchmark::ClobberMemory();
-        }
-        const auto values = state.iterations() * static_cast<std::int64_t>(n);
-        state.SetItemsProcessed(values);
-        state.SetBytesProcessed(values * static_cast<std::int64_t>(sizeof(Value)));
-      })
-      ->UseRealTime()
-      ->MinTime(0.1)
+  auto* added = benchmark::RegisterBenchmark(name.c_str(), [n, fill](benchmark::State& state) {
+    std::vector<Value> out(n);
+    fill(n, out.data());
+    for (auto _ : state) {
+      fill(n, out.data());
+      benchmark::ClobberMemory();
+    }
+    const auto values = state.iterations() * static_cast<std::int64_t>(n);
+    state.SetItemsProcessed(values);
+    state.SetBytesProcessed(values * static_cast<std::int64_t>(sizeof(Value)));
+  });
+  added->MinTime(0.1)
       ->Repetitions(repetitions)
       ->ReportAggregatesOnly()
       ->Unit(benchmark::kMillisecond);
+  if (n == large)
+    added->UseRealTime();
 }
 
 void check(int status) {
@@ -98,24 +99,25 @@ void add_peers() {
 #endif
 }
 
-void print_ratios(const ratio_reporter& r) {
-  std::printf("\nQuotients of the median rates (values per second)\n");
-  r.print_ratio("rvx/float", "random123/float", 2.0);
-  r.print_ratio("rvx/float", "std_mt19937/float", 6.0);
-  for (const char* peer : {"random123", "std_mt19937", "boost_mt19937"})
-    for (const char* kind : {"words", "float", "double"})
-      r.print_ratio(std::string("rvx/") + kind, std::string(peer) + "/" + kind);
-  // Floats are bound by arithmetic and have to scale; words and doubles meet the memory first.
-  r.print_ratio("rvx/float/large/2threads", "rvx/float/large/1thread", 1.8,
-                "memset/large/2threads");
-  for (const char* kind : {"words", "double"}) {
-    const std::string name = std::string("rvx/") + kind + "/large/";
-    r.print_ratio(name + "2threads", name + "1thread");
+void announce_tables() {
+  std::vector<quotient> peers, threads, memory;
+  for (const std::string kind : {"words", "float", "double"}) {
+    const std::string here = "rvx/" + kind, shared_out = here + "/large/";
+    const bool floats = kind == "float";
+    peers.push_back({here, {"random123/" + kind}, floats ? 2.0 : 0});
+    peers.push_back({here, {"std_mt19937/" + kind}, floats ? 6.0 : 0});
+    peers.push_back({here, {"boost_mt19937/" + kind}});
+    // Floats are bound by arithmetic and have to scale; words and doubles meet the memory first.
+    threads.push_back({shared_out + "2threads",
+                       {shared_out + "1thread"},
+                       floats ? 1.8 : 0,
+                       "memset/large/2threads"});
+    memory.push_back({shared_out + "1thread", {"memset/large/1thread"}});
+    memory.push_back({shared_out + "2threads", {"memset/large/2threads"}});
   }
-  for (const char* threads : {"1thread", "2threads"})
-    for (const char* kind : {"words", "float", "double"})
-      r.print_ratio(std::string("rvx/") + kind + "/large/" + threads,
-                    std::string("memset/large/") + threads);
+  announce_quotients("peers", peers);
+  announce_quotients("threads", threads);
+  announce_quotients("memory", memory);
 }
 
 }  // namespace
@@ -136,9 +138,8 @@ int main(int argc, char** argv) {
   add_memset(large, 1, "/large/1thread");
   add_memset(large, 2, "/large/2threads");
 
-  ratio_reporter reporter;
-  benchmark::RunSpecifiedBenchmarks(&reporter);
-  print_ratios(reporter);
+  announce_tables();
+  benchmark::RunSpecifiedBenchmarks();
   check(rvxDeleteStream(&stream));
   return 0;
 }

@@ -11,6 +11,7 @@
 #include <boost/random/mersenne_twister.hpp>
 #include <boost/random/normal_distribution.hpp>
 #include <boost/random/poisson_distribution.hpp>
+#include <boost/random/uniform_real_distribution.hpp>
 #include <gsl/gsl_randist.h>
 #include <gsl/gsl_rng.h>
 #include <Random123/philox.h>
@@ -42,6 +43,18 @@ void random123_uniform(std::size_t n, Value* out) {
 boost::random::mt19937 boost_engine;
 std::mt19937 std_engine;
 
+void boost_uniform(std::size_t n, double* out) {
+  boost::random::uniform_real_distribution<double> uniform;
+  loop(n, out, [&] { return uniform(boost_engine); });
+}
+void std_uniform(std::size_t n, double* out) {
+  std::uniform_real_distribution<double> uniform;
+  loop(n, out, [&] { return uniform(std_engine); });
+}
+void std_normal(std::size_t n, double* out) {
+  std::normal_distribution<double> normal;
+  loop(n, out, [&] { return normal(std_engine); });
+}
 template <class Value>
 void boost_normal(std::size_t n, Value* out) {
   boost::random::normal_distribution<Value> normal;
@@ -77,6 +90,13 @@ const gsl_rng* gsl_engine() {
   static const std::unique_ptr<gsl_rng, free_generator> engine(gsl_rng_alloc(gsl_rng_mt19937));
   return engine.get();
 }
+void gsl_uniform(std::size_t n, double* out) {
+  loop(n, out, [] { return gsl_rng_uniform(gsl_engine()); });
+}
+// Its ziggurat, the one of its methods that is meant to be fast.
+void gsl_normal(std::size_t n, double* out) {
+  loop(n, out, [] { return gsl_ran_gaussian_ziggurat(gsl_engine(), 1); });
+}
 void gsl_gamma(std::size_t n, double* out) {
   loop(n, out, [] { return gsl_ran_gamma(gsl_engine(), 2.5, 1); });
 }
@@ -91,28 +111,33 @@ void gsl_poisson(std::size_t n, std::int32_t* out) {
 }  // namespace
 
 const std::vector<peer<fill_floats>> float_peers = {
-    {"random123/uniform_float", random123_uniform<float>},
-    {"boost/normal_float", boost_normal<float>},
-    {"boost/exponential_float", boost_exponential},
+    {"uniform_float/random123", random123_uniform<float>},
+    {"normal_float/boost", boost_normal<float>},
+    {"exponential_float/boost", boost_exponential},
 };
 const std::vector<peer<fill_doubles>> double_peers = {
-    {"random123/uniform_double", random123_uniform<double>},
-    {"boost/normal_double", boost_normal<double>},
-    {"std/gamma", std_gamma},
-    {"gsl/gamma", gsl_gamma},
-    {"gsl/beta", gsl_beta},
+    {"uniform_double/random123", random123_uniform<double>},
+    {"normal_double/boost", boost_normal<double>},
+    {"gamma/std", std_gamma},
+    {"gamma/gsl", gsl_gamma},
+    {"beta/gsl", gsl_beta},
+};
+const std::vector<peer<fill_doubles>> speed_peers = {
+    {"uniform/std", std_uniform},     {"uniform/gsl", gsl_uniform},
+    {"uniform/boost", boost_uniform}, {"gaussian/std", std_normal},
+    {"gaussian/gsl", gsl_normal},     {"gaussian/boost", boost_normal<double>},
 };
 const std::vector<peer<fill_integers>> integer_peers = {
-    {"std/poisson_10", std_poisson<10>},     {"std/poisson_500", std_poisson<500>},
-    {"boost/poisson_10", boost_poisson<10>}, {"boost/poisson_500", boost_poisson<500>},
-    {"gsl/poisson_10", gsl_poisson<10>},     {"gsl/poisson_500", gsl_poisson<500>},
-    {"boost/binomial", boost_binomial},
+    {"poisson_10/std", std_poisson<10>},     {"poisson_500/std", std_poisson<500>},
+    {"poisson_10/boost", boost_poisson<10>}, {"poisson_500/boost", boost_poisson<500>},
+    {"poisson_10/gsl", gsl_poisson<10>},     {"poisson_500/gsl", gsl_poisson<500>},
+    {"binomial/boost", boost_binomial},
 };
 
 // The median of nine calls of four million values each, of the faster of NumPy's two usual
 // generators, in CPU time of the thread, as ours is. Where NumPy fills an array of the caller's it
 // does (out=); its other distributions can only make one, which their time has in it.
-std::vector<numpy_rate> numpy_rates() {
+std::vector<foreign_rate> numpy_rates() {
   static const char script[] =
       "import time, statistics\n"
       "try:\n"
@@ -142,7 +167,7 @@ std::vector<numpy_rate> numpy_rates() {
       "      times.append(time.thread_time() - start)\n"
       "    best = max(best, results.size / statistics.median(times))\n"
       "  print(name, best)\n";
-  std::vector<numpy_rate> rates;
+  std::vector<foreign_rate> rates;
   const std::string command =
       std::string("/usr/bin/python3 - <<'END' 2>/dev/null\n") + script + "END";
   std::FILE* output = popen(command.c_str(), "r");
@@ -151,7 +176,7 @@ std::vector<numpy_rate> numpy_rates() {
   char name[64];
   double rate = 0;
   while (std::fscanf(output, "%63s %lf", name, &rate) == 2)
-    rates.push_back({std::string("numpy/") + name, rate});
+    rates.push_back({std::string(name) + "/numpy", rate});
   pclose(output);
   return rates;
 }

@@ -4,8 +4,9 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <string>
 #include <vector>
+
+#include "../comparisons.hpp"
 
 namespace peers {
 
@@ -22,12 +23,10 @@ struct peer {
 extern const std::vector<peer<fill_floats>> float_peers;
 extern const std::vector<peer<fill_doubles>> double_peers;
 extern const std::vector<peer<fill_integers>> integer_peers;
+// Those of the plot in the README.
+extern const std::vector<peer<fill_doubles>> speed_peers;
 
-// Rates of NumPy (values per second), measured by the Python that is on the path, or none.
-struct numpy_rate {
-  std::string name;
-  double rate;
-};
-std::vector<numpy_rate> numpy_rates();
+// Rates of NumPy, measured by the Python that is on the path, or none.
+std::vector<foreign_rate> numpy_rates();
 
 }  // namespace peers

@@ -1,79 +1,29 @@
 // SPDX-License-Identifier: Apache-2.0
-// distribution_histograms FOLDER: draws a million values of each distribution with philox4x32x10
-// and writes FOLDER/<name>.density or FOLDER/<name>.probabilities: a line of headings, then in each
-// line a place, the height of the histogram there, and that of the law.
-#include <cmath>
-#include <cstdint>
+// tarn_gallery DOCS COLUMNS: the figures of the manual below DOCS. Writes the page DOCS/gallery.md
+// and the pictures DOCS/engines/*.svg, and the columns of the histograms into the folder COLUMNS,
+// from which distributions.gnuplot draws DOCS/distributions/*.svg.
 #include <cstdio>
 #include <exception>
-#include <fstream>
-#include <stdexcept>
 
-#include "plots.hpp"
-
-namespace {
-
-constexpr std::size_t count = 1000000;
-constexpr std::uint64_t seed = 1;
-
-// Bars of equal width side by side.
-struct bars {
-  double start, width;
-  std::size_t n;
-
-  explicit bars(const plot& of)
-      : start(of.integers ? of.low - 0.5 : of.low),
-        width(of.integers ? 1 : (of.high - of.low) / 70),
-        n(of.integers ? static_cast<std::size_t>(of.high - of.low) + 1 : 70) {}
-
-  double middle(std::size_t bar) const { return start + (static_cast<double>(bar) + 0.5) * width; }
-};
-
-// The share of the values in each bar for each unit of length; those outside all bars count too.
-std::vector<double> heights_of(const std::vector<double>& values, const bars& at) {
-  std::vector<double> heights(at.n, 0);
-  const double one = 1 / (static_cast<double>(values.size()) * at.width);
-  for (const double x : values) {
-    const double bar = std::floor((x - at.start) / at.width);
-    if (bar >= 0 && bar < static_cast<double>(at.n))
-      heights[static_cast<std::size_t>(bar)] += one;
-  }
-  return heights;
-}
-
-// Every plot starts from the same stream, so that none depends on the others.
-std::vector<double> draw(const plot& of) {
-  rvx_stream stream = nullptr;
-  if (rvxNewStream(&stream, RVX_BRNG_PHILOX4X32X10, seed) != RVX_STATUS_OK)
-    throw std::runtime_error("no stream");
-  const std::vector<double> values = of.draw(stream, count);
-  rvxDeleteStream(&stream);
-  return values;
-}
-
-void write(const plot& of, const std::string& folder) {
-  const bars at(of);
-  const std::vector<double> heights = heights_of(draw(of), at);
-  std::ofstream file(folder + '/' + of.name + (of.integers ? ".probabilities" : ".density"));
-  file << "at \"drawn, " << of.parameters << "\" law\n";
-  for (std::size_t i = 0; i < at.n; ++i)
-    file << at.middle(i) << ' ' << heights[i] << ' ' << of.law(at.middle(i)) << '\n';
-  if (!file.flush())
-    throw std::runtime_error("cannot write the columns of " + of.name);
-}
-
-}  // namespace
+#include "histograms.hpp"
+#include "page.hpp"
 
 int main(int argc, char** argv) {
-  if (argc != 2) {
-    std::fprintf(stderr, "usage: distribution_histograms FOLDER\n");
+  if (argc != 3) {
+    std::fprintf(stderr, "usage: tarn_gallery DOCS COLUMNS\n");
     return 2;
   }
   try {
-    for (const plot& of : every_plot())
-      write(of, argv[1]);
+    const std::string docs = argv[1];
+    const std::vector<plot> plots = every_plot();
+    const std::vector<scatter> scatters = every_scatter();
+    for (const plot& of : plots)
+      write_columns(of, argv[2]);
+    for (const scatter& of : scatters)
+      write_scatter(of, docs + "/engines");
+    write_page(plots, scatters, docs + "/gallery.md");
   } catch (const std::exception& failure) {
-    std::fprintf(stderr, "distribution_histograms: %s\n", failure.what());
+    std::fprintf(stderr, "tarn_gallery: %s\n", failure.what());
     return 1;
   }
   return 0;

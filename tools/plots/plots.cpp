@@ -5,6 +5,7 @@
 
 #include <cmath>
 #include <cstdint>
+#include <limits>
 #include <stdexcept>
 
 namespace {
@@ -47,11 +48,15 @@ double binomial_probability(double k, double ntrial, double p) {
   return choose(ntrial, k) * exp(k * log(p) + (ntrial - k) * log1p(-p));
 }
 
-std::vector<double> fractions_of_words(rvx_stream stream, std::size_t n) {
-  std::vector<double> values = by(rvxiRngUniformBits32, RVX_RNG_METHOD_STANDARD)(stream, n);
-  for (double& x : values)
-    x *= 0x1p-32;
-  return values;
+// Words by a routine, as fractions of 2^bits.
+template <class Word>
+auto fractions_by(int (*routine)(std::int64_t, rvx_stream, std::int64_t, Word*)) {
+  return [=](rvx_stream stream, std::size_t n) {
+    std::vector<double> values = by(routine, RVX_RNG_METHOD_STANDARD)(stream, n);
+    for (double& x : values)
+      x = std::ldexp(x, -std::numeric_limits<Word>::digits);
+    return values;
+  };
 }
 
 // ---- Of several numbers each ----------------------------------------------------------------
@@ -134,7 +139,9 @@ void add_real(std::vector<plot>& all) {
          const double z = (x - 1) / 2;
          return 1 / (2 * pi * (1 + z * z));
        }});
-  all.push_back({"bits", "words of philox4x32x10 / 2^32", false, 0, 1, fractions_of_words,
+  all.push_back({"bits", "words of philox4x32x10 / 2^32", false, 0, 1,
+                 fractions_by(rvxiRngUniformBits), [](double) { return 1.0; }});
+  all.push_back({"uniform_bits", "64 bits / 2^64", false, 0, 1, fractions_by(rvxiRngUniformBits64),
                  [](double) { return 1.0; }});
 }
 

@@ -10,7 +10,7 @@
 #include <vector>
 
 struct plot {
-  std::string name;        // of the page
+  std::string name;        // of the family
   std::string parameters;  // as the key of the figure gives them
   bool integers;  // one bar for each integer of [low, high]; else equal parts of [low, high)
   double low, high;
