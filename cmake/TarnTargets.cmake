@@ -18,6 +18,16 @@ set(CMAKE_RUNTIME_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/bin")
 set(CMAKE_LIBRARY_OUTPUT_DIRECTORY "${CMAKE_BINARY_DIR}/lib")
 set(CMAKE_INSTALL_RPATH "$ORIGIN")
 
+# The number in the names of all libraries (soname). A program keeps to the one it was linked to: below
+# 1.0 a new minor version may break it, from then on a new major version.
+set(TARN_SOVERSION ${PROJECT_VERSION_MAJOR})
+if(PROJECT_VERSION_MAJOR EQUAL 0)
+  set(TARN_SOVERSION 0.${PROJECT_VERSION_MINOR})
+endif()
+
+# The one public header that is made: what the others belong to.
+configure_file("${CMAKE_CURRENT_LIST_DIR}/tarn_version.h.in" "${PROJECT_BINARY_DIR}/include/tarn_version.h")
+
 find_program(TARN_CCACHE ccache)
 if(TARN_CCACHE AND NOT CMAKE_CXX_COMPILER_LAUNCHER)
   set(CMAKE_C_COMPILER_LAUNCHER "${TARN_CCACHE}")
@@ -72,7 +82,7 @@ function(tarn_shared_library target output export)
   add_library(${target} SHARED ${ARGN})
   add_library(tarn::${export} ALIAS ${target})
   set_target_properties(${target} PROPERTIES OUTPUT_NAME ${output} EXPORT_NAME ${export}
-                        VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR})
+                        VERSION ${PROJECT_VERSION} SOVERSION ${TARN_SOVERSION})
   if(NOT TARN_SANITIZE)  # the sanitizers' own symbols come with the program
     target_link_options(${target} PRIVATE -Wl,--no-undefined -Wl,--as-needed)
   endif()

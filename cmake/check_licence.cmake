@@ -4,7 +4,7 @@
 cmake_minimum_required(VERSION 3.25)
 include("${CMAKE_CURRENT_LIST_DIR}/house_files.cmake")
 
-house_files("${ROOT}" files ${HOUSE_CODE} *.cmake *.in *.map *.awk *.sh CMakeLists.txt)
+house_files("${ROOT}" files ${HOUSE_CODE} *.f90 *.cmake *.in *.map *.awk *.py *.sh CMakeLists.txt)
 foreach(file run .ci/run packages.txt CMakeLists.txt)
   if(EXISTS "${ROOT}/${file}")
     list(APPEND files "${file}")

@@ -1,8 +1,8 @@
 # SPDX-License-Identifier: Apache-2.0
-# One step of the consumer tests; see CMakeLists.txt for the variables. `install` makes
-# SCRATCH/moved, which is what all others build against.
+# One step of the consumer tests; see CMakeLists.txt for the variables. `install` makes the copy in
+# PREFIX; all others build against such a copy.
 cmake_minimum_required(VERSION 3.25)
-set(prefix "${SCRATCH}/moved")
+set(prefix "${PREFIX}")
 set(project "${CMAKE_CURRENT_LIST_DIR}/project")
 set(sanitize "")
 if(SANITIZE)
@@ -51,24 +51,52 @@ function(check_said who said)
   endif()
 endfunction()
 
-# build_by_pkg_config(MODULE COMPILER SOURCE PROGRAM FLAG...): as a user would on one line.
-function(build_by_pkg_config module compiler source program)
+# Sees that a program without a device printed the statuses of the offload entries, and that the
+# library said nothing.
+function(check_refused program)
+  execute_process(COMMAND "${program}" RESULT_VARIABLE result OUTPUT_VARIABLE said ERROR_VARIABLE erred)
+  string(CONCAT meant "by value -2 -2\nby address -2 -2\nby value -3 -3\nby address -3 -3\n"
+                      "the stream has not moved\n")
+  if(NOT result EQUAL 0 OR NOT said STREQUAL meant OR NOT erred STREQUAL "")
+    message(FATAL_ERROR "${program} ended with ${result}:\n${said}\n${erred}")
+  endif()
+endfunction()
+
+# Sees that the program loads our libraries, with the one that is found by name, from the copy alone.
+function(check_loaded program)
+  execute_process(COMMAND "${CMAKE_COMMAND}" -E env LD_DEBUG=files "${program}"
+                  OUTPUT_QUIET ERROR_VARIABLE files)
+  string(REGEX MATCHALL "calling init: [^\n]*/libtarn_[^\n]*" loaded "${files}")
+  foreach(library IN LISTS loaded)
+    string(FIND "${library}" "calling init: ${prefix}/${LIBDIR}/libtarn_" at)
+    if(NOT at EQUAL 0)
+      message(FATAL_ERROR "${program} loads ${library}, not from ${prefix}/${LIBDIR}")
+    endif()
+  endforeach()
+  if(NOT loaded MATCHES "libtarn_vlx")
+    message(FATAL_ERROR "${program} does not load libtarn_vlx:\n${loaded}")
+  endif()
+endfunction()
+
+# build_by_pkg_config(OUT MODULES COMPILER SOURCE FLAG...): the program, built as a user would on one
+# line.
+function(build_by_pkg_config out modules compiler source)
   set(ENV{PKG_CONFIG_PATH} "${prefix}/${LIBDIR}/pkgconfig")
-  run(flags pkg-config --cflags --libs ${module})
+  run(flags pkg-config --cflags --libs ${modules})
   separate_arguments(flags UNIX_COMMAND "${flags}")
+  set(program "${SCRATCH}/${STEP}/program")
   file(MAKE_DIRECTORY "${SCRATCH}/${STEP}")
   run(ignored ${compiler} ${ARGN} ${sanitize} -Wall -Wextra -Wpedantic -Werror
-      "${project}/${source}" -o "${SCRATCH}/${STEP}/${program}" ${flags}
-      "-Wl,-rpath,${prefix}/${LIBDIR}")
-  run(said "${SCRATCH}/${STEP}/${program}")
-  check_said("${STEP}" "${said}")
+      "${project}/${source}" -o "${program}" ${flags} "-Wl,-rpath,${prefix}/${LIBDIR}")
+  set(${out} "${program}" PARENT_SCOPE)
 endfunction()
 
 if(STEP STREQUAL "install")
   file(REMOVE_RECURSE "${SCRATCH}")
   run(ignored "${CMAKE_COMMAND}" --install "${HOUSE}" --prefix "${SCRATCH}/first")
   file(RENAME "${SCRATCH}/first" "${prefix}")
-  file(GLOB_RECURSE texts "${prefix}/*.cmake" "${prefix}/*.pc" "${prefix}/*.hpp" "${prefix}/*.h")
+  file(GLOB_RECURSE texts "${prefix}/*.cmake" "${prefix}/*.pc" "${prefix}/*.hpp" "${prefix}/*.h"
+       "${prefix}/*.f90")
   foreach(text IN LISTS texts)
     file(READ "${text}" content)
     foreach(place "${HOUSE_SOURCE}" "${HOUSE}" "${SCRATCH}")
@@ -93,17 +121,53 @@ if(STEP STREQUAL "install")
 elseif(STEP STREQUAL "find_package")
   set(build "${SCRATCH}/${STEP}")
   run(ignored "${CMAKE_COMMAND}" -S "${project}" -B "${build}" -DCMAKE_PREFIX_PATH=${prefix}
-      -DCMAKE_C_COMPILER=${CC} -DCMAKE_CXX_COMPILER=${CXX} -DCMAKE_BUILD_TYPE=Release
-      "-DCMAKE_C_FLAGS=${sanitize}" "-DCMAKE_CXX_FLAGS=${sanitize}")
+      -DCMAKE_C_COMPILER=${CC} -DCMAKE_CXX_COMPILER=${CXX} -DCMAKE_Fortran_COMPILER=${FC}
+      -DCMAKE_BUILD_TYPE=Release "-DCMAKE_C_FLAGS=${sanitize}" "-DCMAKE_CXX_FLAGS=${sanitize}"
+      "-DCMAKE_Fortran_FLAGS=${sanitize}")
   run(ignored "${CMAKE_COMMAND}" --build "${build}")
   foreach(program consumer consumer_c)
     run(said "${build}/${program}")
     check_said("find_package ${program}" "${said}")
+    check_loaded("${build}/${program}")
+  endforeach()
+  check_refused("${build}/consumer_offload_c")
+  if(FC)
+    check_refused("${build}/consumer_offload_fortran")
+  endif()
+elseif(STEP STREQUAL "versions")
+  run(ignored "${CMAKE_COMMAND}" -S "${CMAKE_CURRENT_LIST_DIR}/versions" -B "${SCRATCH}/${STEP}"
+      -DCMAKE_PREFIX_PATH=${prefix} -DHAVE=${VERSION})
+  set(ENV{PKG_CONFIG_PATH} "${prefix}/${LIBDIR}/pkgconfig")
+  foreach(module tarn_rng tarn_statistics)
+    run(ignored pkg-config --validate ${module})
+    run(version pkg-config --modversion ${module})
+    if(NOT version STREQUAL "${VERSION}\n")
+      message(FATAL_ERROR "pkg-config: ${module} has the version ${version}, not ${VERSION}")
+    endif()
   endforeach()
 elseif(STEP STREQUAL "pkg_config")
-  build_by_pkg_config(tarn_rng "${CXX}" consumer.cpp consumer -std=c++17)
+  build_by_pkg_config(program tarn_rng "${CXX}" consumer.cpp -std=c++17)
+  run(said "${program}")
+  check_said("${STEP}" "${said}")
+  check_loaded("${program}")
 elseif(STEP STREQUAL "pkg_config_c")
-  build_by_pkg_config(tarn_statistics "${CC}" consumer.c consumer_c -std=c11)
+  build_by_pkg_config(program tarn_statistics "${CC}" consumer.c -std=c11)
+  run(said "${program}")
+  check_said("${STEP}" "${said}")
+elseif(STEP STREQUAL "offload_c")
+  build_by_pkg_config(program "tarn_rng;tarn_statistics" "${CC}" consumer_offload.c -std=c99)
+  check_refused("${program}")
+elseif(STEP STREQUAL "offload_fortran")
+  if(NOT FC)
+    message(STATUS "skipped: there is no Fortran compiler")
+    return()
+  endif()
+  set(ENV{PKG_CONFIG_PATH} "${prefix}/${LIBDIR}/pkgconfig")
+  run(modules pkg-config --variable=fortrandir tarn_rng)
+  string(STRIP "${modules}" modules)
+  build_by_pkg_config(program "tarn_rng;tarn_statistics" "${FC}" consumer_offload.f90 -std=f2018
+    "-J${SCRATCH}/${STEP}" "${modules}/tarn_rvx.f90" "${modules}/tarn_rvx_offload.f90")
+  check_refused("${program}")
 else()
   message(FATAL_ERROR "no such step: '${STEP}'")
 endif()

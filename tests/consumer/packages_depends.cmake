@@ -1,0 +1,51 @@
+# SPDX-License-Identifier: Apache-2.0
+# The packages that `depends` names are those whose libraries ours are linked to, no more and no fewer.
+# depends_selftest takes the last one away and adds another: both must be found.
+string(REGEX REPLACE " *\\([^)]*\\)" "" named "${depends}")
+string(REGEX REPLACE ", *" ";" named "${named}")
+
+if(STEP STREQUAL "depends_selftest")
+  list(POP_BACK named taken)
+  list(APPEND named libtarn-nonsense)
+endif()
+
+set(needed)
+file(GLOB libraries "${PREFIX}/${LIBDIR}/libtarn_*.so")
+foreach(library IN LISTS libraries)
+  run(dynamic "${READELF}" -d "${library}")
+  string(REPLACE "[" "<" dynamic "${dynamic}")  # an open bracket would join elements of a list
+  string(REGEX MATCHALL "\\(NEEDED\\)[^\n]*<[A-Za-z0-9_.+-]+" entries "${dynamic}")
+  list(TRANSFORM entries REPLACE ".*<" "")
+  list(FILTER entries EXCLUDE REGEX "^libtarn_")
+  list(APPEND needed ${entries})
+endforeach()
+list(REMOVE_DUPLICATES needed)
+
+# The packages that have them in the folder of the loader; one question to dpkg, which is slow.
+set(paths ${needed})
+list(TRANSFORM paths PREPEND "*/${LIBDIR}/")
+run(answer dpkg-query --search ${paths})
+set(owners)
+foreach(soname IN LISTS needed)
+  string(REGEX REPLACE "([.+])" "\\\\\\1" pattern "${soname}")
+  if(NOT answer MATCHES "(^|\n)([a-z0-9.+-]+)(:[a-z0-9]+)?: (/usr)?/${LIBDIR}/${pattern}(\n|$)")
+    message(FATAL_ERROR "no package has ${soname}: ${answer}")
+  endif()
+  list(APPEND owners ${CMAKE_MATCH_2})
+endforeach()
+list(REMOVE_DUPLICATES owners)
+if(NOT owners)
+  message(FATAL_ERROR "the libraries need nothing: nothing was checked")
+endif()
+
+set(missing ${owners})
+list(REMOVE_ITEM missing ${named})
+set(idle ${named})
+list(REMOVE_ITEM idle ${owners})
+if(STEP STREQUAL "depends_selftest")
+  equal("packages missed" "${missing}" "${taken}")
+  equal("packages not needed" "${idle}" libtarn-nonsense)
+else()
+  equal("packages missed by ${runtime}" "${missing}" "")
+  equal("packages not needed by ${runtime}" "${idle}" "")
+endif()
