@@ -2,6 +2,10 @@
 // The demonstration behind `./run demo`: one seed, two devices, the same numbers. Fills 100 million
 // uniform floats on the processor and 1 million on a GPU (lumen's virtual one where there is no
 // other), compares the common prefix bit for bit, and shows rates and a histogram.
+//
+//   tarn_demo [MILLIONS]    so many floats on the processor
+//
+// Build: g++ -std=c++17 demo.cpp $(pkg-config --cflags --libs tarn_rng) -o demo
 #include <algorithm>
 #include <array>
 #include <chrono>
@@ -20,8 +24,8 @@ namespace {
 namespace rng = kestrel::tarn::rng;
 
 constexpr std::uint64_t seed = 20240229;
-constexpr std::int64_t cpu_count = 100000000;
-constexpr std::int64_t gpu_count = 1000000;
+constexpr std::int64_t million = 1000000;
+constexpr std::int64_t gpu_count = million;
 constexpr int repetitions = 5;
 
 /// Median seconds of `repetitions` runs.
@@ -72,15 +76,17 @@ void print_histogram(const float* values, std::int64_t count) {
   }
 }
 
-int demonstrate() {
+int demonstrate(std::int64_t cpu_count) {
   // Profiling, so that TARN_VERBOSE=2 can report device times.
   const sycl::property_list profiling{sycl::property::queue::enable_profiling{}};
   sycl::queue cpu{sycl::cpu_selector_v, profiling};
   sycl::queue gpu{sycl::gpu_selector_v, profiling};
-  auto* cpu_values = sycl::malloc_shared<float>(cpu_count, cpu);
+  const std::size_t bytes = static_cast<std::size_t>(cpu_count) * sizeof(float);
+  auto* cpu_values = static_cast<float*>(sycl::malloc_shared(bytes, cpu));
   auto* gpu_values = sycl::malloc_shared<float>(gpu_count, gpu);
   if (cpu_values == nullptr || gpu_values == nullptr) {
-    std::fprintf(stderr, "demo: not enough memory: 404 MB are needed\n");
+    std::fprintf(stderr, "demo: not enough memory: %lld MB are needed\n",
+                 static_cast<long long>((cpu_count + gpu_count) * 4 / million));
     return EXIT_FAILURE;
   }
 
@@ -88,7 +94,6 @@ int demonstrate() {
               static_cast<unsigned long long>(seed));
   std::printf("  CPU queue: %s\n  GPU queue: %s\n\n", device_name(cpu).c_str(),
               device_name(gpu).c_str());
-  const std::size_t bytes = cpu_count * sizeof(float);
   std::memset(cpu_values, 1, bytes);  // pages are there before anything is timed
   std::memset(gpu_values, 1, gpu_count * sizeof(float));
   print_rate("memory set", cpu_count, seconds_of([&] { std::memset(cpu_values, 2, bytes); }));
@@ -108,12 +113,17 @@ int demonstrate() {
 
 }  // namespace
 
-int main() {
+int main(int argc, char** argv) {
+  const std::int64_t millions = argc > 1 ? std::atoll(argv[1]) : 100;
+  if (argc > 2 || millions < 1 || millions > 100000) {
+    std::fprintf(stderr, "usage: tarn_demo [MILLIONS], 1 to 100000\n");
+    return EXIT_FAILURE;
+  }
   // A GPU for everybody: lumen shows a virtual one that runs on the processor. A value that the
   // user has set stays.
   setenv("LUMEN_VIRTUAL_DEVICES", "gpu", 0);
   try {
-    return demonstrate();
+    return demonstrate(millions * million);
   } catch (const std::exception& error) {
     std::fprintf(stderr, "demo: %s\n", error.what());
     return EXIT_FAILURE;

@@ -1,7 +1,8 @@
 /* SPDX-License-Identifier: Apache-2.0
  * Streams in C, without any SYCL: independent workers in three ways, a saved stream that goes on,
- * and a quasi-random estimate of pi. Build: cc streams.c $(pkg-config --cflags --libs
- * tarn_statistics)
+ * and a quasi-random estimate of pi.
+ *
+ * Build: cc streams.c $(pkg-config --cflags --libs tarn_statistics) -o streams
  */
 #include <stdint.h>
 #include <stdio.h>
@@ -23,7 +24,7 @@ static void print_words(const char* label, int worker, rvx_stream stream) {
   check(rvxiRngUniformBits(RVX_RNG_METHOD_STANDARD, stream, words_per_worker, words), "words");
   printf("  %s %d:", label, worker);
   for (int i = 0; i < words_per_worker; ++i)
-    printf(" %08x", (unsigned)words[i]);
+    printf(" %08X", (unsigned)words[i]);
   printf("\n");
 }
 

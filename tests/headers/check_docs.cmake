@@ -16,7 +16,8 @@ if(NOT status EQUAL 0)
   message(FATAL_ERROR "something public is not documented, or not rightly:\n${text}")
 endif()
 # One page of each language that is there only if its headers were read.
-foreach(page index.html namespacekestrel_1_1tarn_1_1rng.html tarn__rvx_8h.html tarn__serv_8h.html)
+foreach(page index.html namespacekestrel_1_1tarn_1_1rng.html tarn__rvx_8h.html tarn__rvx__offload_8h.html
+        tarn__serv_8h.html)
   if(NOT EXISTS "${OUT}/html/${page}")
     message(FATAL_ERROR "the reference has no page ${page}")
   endif()

@@ -13,6 +13,8 @@ function(check result text)
   execute_process(COMMAND "${CMAKE_COMMAND}" "-DROOT=${FIXTURE}" "-DDOXYFILE=${FIXTURE}/docs/Doxyfile"
                           "-DOUT=${FIXTURE}/out" -P "${CHECK}"
                   RESULT_VARIABLE status OUTPUT_QUIET ERROR_VARIABLE said)
+  # CMake breaks lines of its messages, where depends on the length of the folder's name.
+  string(REGEX REPLACE "[ \n]+" " " said "${said}")
   set(${result} "${status}" PARENT_SCOPE)
   set(${text} "${said}" PARENT_SCOPE)
 endfunction()
@@ -30,7 +32,7 @@ function(expect_found file text needle)
 endfunction()
 
 file(REMOVE_RECURSE "${FIXTURE}")
-foreach(part docs rng/include service/include statistics/include core/include)
+foreach(part docs rng/include service/include statistics/include core/include offload/include)
   file(COPY "${ROOT}/${part}/" DESTINATION "${FIXTURE}/${part}")
 endforeach()
 check(status said)
@@ -46,3 +48,4 @@ expect_found(${cxx} "namespace kestrel::tarn::rng {\n/// Takes.\n/// \\param b  
              "'b' of command")
 expect_found(statistics/include/tarn_rvx.h "RVX_API int rvxBare(void)\;\n" "rvxBare")
 expect_found(core/include/tarn_serv.h "TARN_SERV_API int tarn_serv_bare(void)\;\n" "tarn_serv_bare")
+expect_found(offload/include/tarn_rvx_offload.h "TARN_RVX_OFFLOAD_API int tarn_rvx_bare(void)\;\n" "tarn_rvx_bare")

@@ -26,7 +26,7 @@ if(NOT result EQUAL 0)
 endif()
 
 foreach(file core/a.cpp core/b.hpp rng/c.def lumen/d.cu cmake/e.cmake rng/exports.map
-        tools/f.awk tools/g.sh core/CMakeLists.txt run .ci/run)
+        tools/f.awk tools/f.py tools/g.sh offload/h.f90 core/CMakeLists.txt run .ci/run)
   file(WRITE "${FIXTURE}/${file}" "\n\n\n# ${mark}")  # too far down
   check()
   string(FIND "${said}" "${file}: " at)

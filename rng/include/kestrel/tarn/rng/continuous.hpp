@@ -14,9 +14,11 @@ namespace kestrel::tarn::rng {
 
 /// How uniform draws: one word for one result.
 namespace uniform_method {
-/// Rounding may deliver the upper bound.
+/// Rounding may deliver the upper bound; of std::int32_t, which passes through float, bounds are
+/// rounded as well.
 struct TARN_EXPORT standard {};
-/// Reals are clamped to [a, b]; integers are drawn in double precision.
+/// Reals are clamped to [a, b]; integers are drawn in double precision, and a CPU queue truncates
+/// them towards zero.
 struct TARN_EXPORT accurate {};
 }  // namespace uniform_method
 
@@ -27,8 +29,9 @@ inline constexpr Type default_upper_bound = is_real_result<Type> ? Type(1)
                                                                  : std::numeric_limits<Type>::max();
 }  // namespace detail
 
-/// Uniform on [a, b); for integers the floor of a real uniform on [a, b). a < b is expected: a CPU
-/// queue reports anything else and draws nothing.
+/// Uniform on [a, b); for integers the floor of a real uniform on [a, b). Of std::int32_t by the
+/// accurate method a CPU queue truncates instead, which is not uniform when a < 0. a < b is
+/// expected: a CPU queue reports anything else and draws nothing.
 template <typename Type = float, typename Method = uniform_method::standard>
 class TARN_EXPORT uniform {
   static_assert(detail::is_real_result<Type> || detail::is_integer_result<Type>,
