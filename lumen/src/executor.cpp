@@ -239,7 +239,13 @@ void executor::work() {
 }
 
 void executor::stop() {
-  std::unique_lock<std::mutex> lock(mutex_);
+  std::unique_lock<std::mutex> lock(mutex_, std::try_to_lock);
+  if (!lock.owns_lock()) {
+    if (process_ != getpid()) {
+      return;  // held by a worker of the parent at the time of the fork, and for good
+    }
+    lock.lock();
+  }
   stopping_ = true;
   // What is ready runs to its end, and what becomes ready by that. What hangs on a host
   // accessor that nobody will release is left, and so are the tasks that called exit.
